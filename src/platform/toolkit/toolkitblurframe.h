@@ -1,0 +1,45 @@
+#pragma once
+
+#include <QColor>
+#include <QWidget>
+
+/**
+ * A rounded, frameless surface that lets a blurred desktop shine through where the window manager can do that.
+ *
+ * As a window it is translucent with smooth corners under a compositing manager, and opaque and cut to shape without
+ * one. As a child it is a rounded panel. Its children get a palette that suits the mask colour, whatever the
+ * desktop's theme.
+ */
+class ToolkitBlurFrame : public QWidget
+{
+    Q_OBJECT
+
+public:
+    explicit ToolkitBlurFrame(QWidget* parent = nullptr);
+
+    /// The colour laid over the blurred background; its own alpha is ignored. Light grey at first.
+    QColor maskColor() const { return m_maskColor; }
+    void setMaskColor(const QColor& color);
+
+    /// The opacity of the mask, 0 (clear) to 255 (opaque); values outside are clamped. 230 at first.
+    int maskAlpha() const { return m_maskAlpha; }
+    void setMaskAlpha(int alpha);
+
+    /// The corner radius in pixels. 12 at first.
+    int radius() const { return m_radius; }
+    void setRadius(int radius);
+
+protected:
+    bool event(QEvent* event) override;
+    void paintEvent(QPaintEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
+
+private:
+    void updateShape();
+    void updateBlur();
+
+    QColor m_maskColor;
+    int m_maskAlpha = 230;
+    int m_radius = 12;
+    bool m_composited = false;
+};

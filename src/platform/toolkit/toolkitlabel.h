@@ -1,0 +1,32 @@
+#pragma once
+
+#include <QLabel>
+
+/**
+ * A label that shows its text literally, never as mark-up. A text too wide for the label fades out at its end, so
+ * that a part is not taken for the whole; where no tool tip is set, pointing at the label then shows all of it.
+ */
+class ToolkitLabel : public QLabel
+{
+    Q_OBJECT
+
+public:
+    explicit ToolkitLabel(QWidget* parent = nullptr);
+    explicit ToolkitLabel(const QString& text, QWidget* parent = nullptr);
+
+    /// The string to hand to a tool tip so that it reads exactly as @p text, even if @p text looks like mark-up.
+    static QString plainToolTip(const QString& text);
+
+    /// Makes the font smaller, in whole pixels and to no less than 8, until the text fits the label's width.
+    void shrinkFontToWidth();
+
+    /// Raises the text by a pixel, for a label lower than its font's line, so that descenders are not cut off.
+    void makeRoomForDescenders();
+
+protected:
+    bool event(QEvent* event) override;
+    void paintEvent(QPaintEvent* event) override;
+
+private:
+    bool overflows() const;
+};

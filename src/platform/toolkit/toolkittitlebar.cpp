@@ -1,0 +1,169 @@
+#include "toolkittitlebar.h"
+
+#include "toolkitlabel.h"
+
+#include <QApplication>
+#include <QHBoxLayout>
+#include <QMenu>
+#include <QMouseEvent>
+#include <QPainter>
+#include <QToolButton>
+#include <QWindow>
+
+namespace
+{
+
+constexpr int buttonSize = 28;
+constexpr int iconExtent = 20;
+
+/// A button whose sign is drawn from lines, so that it is sharp at every scale and follows the palette.
+class SignButton : public QToolButton
+{
+public:
+    enum class Sign { Close, Menu };
+
+    SignButton(Sign sign, const QString& name, QWidget* parent) : QToolButton(parent), m_sign(sign)
+    {
+        setFixedSize(buttonSize, buttonSize);
+        setAccessibleName(name);
+        setToolTip(name);
+        setAttribute(Qt::WA_Hover);
+        setFocusPolicy(Qt::TabFocus);
+        setPopupMode(QToolButton::InstantPopup);
+    }
+
+protected:
+    void paintEvent(QPaintEvent*) override
+    {
+        QPainter painter(this);
+        painter.setRenderHint(QPainter::Antialiasing);
+        QColor ink = palette().color(QPalette::WindowText);
+        if (isDown() || underMouse()) {
+            ink.setAlpha(isDown() ? 40 : 20);
+            painter.setPen(Qt::NoPen);
+            painter.setBrush(ink);
+            painter.drawRoundedRect(rect(), 6, 6);
+        }
+        if (hasFocus() && window()->testAttribute(Qt::WA_KeyboardFocusChange)) {
+            painter.setPen(QPen(palette().color(QPalette::Highlight), 2));
+            painter.setBrush(Qt::NoBrush);
+            painter.drawRoundedRect(QRectF(rect()).adjusted(1, 1, -1, -1), 6, 6);
+        }
+        ink.setAlpha(isDown() || underMouse() ? 230 : 170);
+        painter.setPen(QPen(ink, 1.4, Qt::SolidLine, Qt::RoundCap));
+        painter.translate(QRectF(rect()).center());
+        constexpr qreal reach = 4.5;
+        if (m_sign == Sign::Close) {
+            painter.drawLine(QPointF(-reach, -reach), QPointF(reach, reach));
+            painter.drawLine(QPointF(-reach, reach), QPointF(reach, -reach));
+        } else {
+            for (const qreal y : {-4.5, -0.5, 3.5})
+                painter.drawLine(QPointF(-reach, y), QPointF(reach, y));
+        }
+    }
+
+private:
+    Sign m_sign;
+};
+
+} // namespace
+
+ToolkitTitlebar::ToolkitTitlebar(QWidget* parent)
+    : QWidget(parent), m_icon(new ToolkitLabel(this)), m_title(new ToolkitLabel(this)),
+      m_menuButton(new SignButton(SignButton::Sign::Menu, QStringLiteral("菜单"), this))
+{
+    auto* closeButton = new SignButton(SignButton::Sign::Close, QStringLiteral("关闭"), this);
+    closeButton->setObjectName(QStringLiteral("titlebarCloseButton"));
+    connect(closeButton, &QToolButton::clicked, this, [this] { window()->close(); });
+
+    auto* layout = new QHBoxLayout(this);
+    layout->setContentsMargins(12, 0, 10, 0);
+    layout->setSpacing(6);
+    layout->addWidget(m_icon);
+    layout->addWidget(m_title, 1);
+    layout->addWidget(m_menuButton);
+    layout->addWidget(closeButton);
+    m_icon->hide();
+    m_menuButton->hide();
+    setBackgroundTransparent(false);
+}
+
+void ToolkitTitlebar::setIcon(const QIcon& icon)
+{
+    const QWindow* handle = window()->windowHandle();
+    const qreal ratio = handle ? handle->devicePixelRatio() : qApp->devicePixelRatio();
+    QPixmap pixmap = icon.pixmap(QSize(iconExtent, iconExtent) * ratio);
+    pixmap.setDevicePixelRatio(qMax<qreal>(1, pixmap.width() / qreal(iconExtent)));
+    m_icon->setPixmap(pixmap);
+    m_icon->setVisible(!icon.isNull());
+}
+
+void ToolkitTitlebar::setTitle(const QString& title)
+{
+    m_title->setText(title);
+}
+
+QString ToolkitTitlebar::title() const
+{
+    return m_title->text();
+}
+
+void ToolkitTitlebar::setMenu(QMenu* menu)
+{
+    m_menuButton->setMenu(menu);
+    updateMenuButton();
+}
+
+void ToolkitTitlebar::setMenuVisible(bool visible)
+{
+    m_menuVisible = visible;
+    updateMenuButton();
+}
+
+void ToolkitTitlebar::updateMenuButton()
+{
+    m_menuButton->setVisible(m_menuVisible && m_menuButton->menu());
+}
+
+void ToolkitTitlebar::setBackgroundTransparent(bool transparent)
+{
+    setAutoFillBackground(!transparent);
+}
+
+void ToolkitTitlebar::mousePressEvent(QMouseEvent* event)
+{
+    if (event->button() != Qt::LeftButton)
+        return QWidget::mousePressEvent(event);
+    m_pressed = true;
+    m_dragging = false;
+    m_pressPosition = event->globalPos();
+    m_windowPosition = window()->pos();
+}
+
+void ToolkitTitlebar::mouseMoveEvent(QMouseEvent* event)
+{
+    if (!m_pressed)
+        return QWidget::mouseMoveEvent(event);
+    const QPoint distance = event->globalPos() - m_pressPosition;
+    if (!m_dragging) {
+        if (distance.manhattanLength() < QApplication::startDragDistance())
+            return;
+        m_dragging = true;
+        emit windowDragged();
+    }
+    // A Wayland client cannot place its windows; the compositor moves them for it.
+    if (QGuiApplication::platformName().startsWith(QLatin1String("wayland"))) {
+        m_pressed = false;
+        if (QWindow* handle = window()->windowHandle())
+            handle->startSystemMove();
+        return;
+    }
+    window()->move(m_windowPosition + distance);
+}
+
+void ToolkitTitlebar::mouseReleaseEvent(QMouseEvent* event)
+{
+    m_pressed = false;
+    m_dragging = false;
+    QWidget::mouseReleaseEvent(event);
+}

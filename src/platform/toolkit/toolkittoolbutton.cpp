@@ -1,0 +1,66 @@
+#include "toolkittoolbutton.h"
+
+#include <QPainter>
+#include <QStyleOptionToolButton>
+
+namespace
+{
+
+/// Room between the text and the focus ring or the button's edge.
+constexpr int textMargin = 5;
+
+} // namespace
+
+ToolkitToolButton::ToolkitToolButton(QWidget* parent) : QToolButton(parent)
+{
+    setAutoRaise(true);
+    setFocusPolicy(Qt::StrongFocus);
+    setAttribute(Qt::WA_Hover);
+    setCursor(Qt::PointingHandCursor);
+}
+
+void ToolkitToolButton::setTextAlignment(Qt::Alignment alignment)
+{
+    m_alignment = alignment & Qt::AlignHorizontal_Mask;
+    update();
+}
+
+void ToolkitToolButton::paintEvent(QPaintEvent*)
+{
+    QPainter painter(this);
+    painter.setRenderHint(QPainter::Antialiasing);
+    const bool hovered = isEnabled() && underMouse();
+    QColor color = palette().color(isEnabled() ? QPalette::Active : QPalette::Disabled, QPalette::ButtonText);
+    if (isDown())
+        color = color.darker(130);
+
+    const int textFlags = static_cast<int>(m_alignment | Qt::AlignVCenter) | Qt::TextShowMnemonic;
+    const QRect textArea = rect().adjusted(textMargin, 0, -textMargin, 0);
+    QRectF ring = rect();
+    if (!icon().isNull()) {
+        if (hovered || isDown()) {
+            QColor highlight = palette().color(QPalette::WindowText);
+            highlight.setAlpha(isDown() ? 36 : 18);
+            painter.setPen(Qt::NoPen);
+            painter.setBrush(highlight);
+            painter.drawRoundedRect(rect(), 6, 6);
+        }
+        QRect iconRect(QPoint(), iconSize());
+        iconRect.moveCenter(rect().center());
+        icon().paint(&painter, iconRect, Qt::AlignCenter, isEnabled() ? QIcon::Normal : QIcon::Disabled);
+    } else {
+        QFont textFont = font();
+        textFont.setUnderline(hovered);
+        painter.setFont(textFont);
+        painter.setPen(color);
+        painter.drawText(textArea, textFlags, text());
+        const QRect textRect = fontMetrics().boundingRect(textArea, textFlags, text());
+        ring = textRect.adjusted(1 - textMargin, 0, textMargin - 1, 0) & rect();
+    }
+
+    if (hasFocus() && window()->testAttribute(Qt::WA_KeyboardFocusChange)) {
+        painter.setPen(QPen(palette().color(QPalette::Highlight), 1));
+        painter.setBrush(Qt::NoBrush);
+        painter.drawRoundedRect(ring.adjusted(0.5, 0.5, -0.5, -0.5), 4, 4);
+    }
+}

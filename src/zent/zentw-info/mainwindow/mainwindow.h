@@ -1,0 +1,190 @@
+#pragma once
+
+#include "toolkitblurframe.h"
+
+#include <QList>
+#include <QPair>
+#include <QString>
+#include <QSystemTrayIcon>
+
+#include <memory>
+
+class InfoWidget;
+class NetworkDaemonProxy;
+class QJsonArray;
+class QNetworkAccessManager;
+class QNetworkReply;
+class QTimer;
+class ToolkitTitlebar;
+struct TNetInfo;
+
+namespace zent
+{
+struct UserData;
+}
+
+/// The client's switchboard: the panel that a click on the tray icon opens, the timers that fetch what it shows, and
+/// the way from its buttons to the dialogs. Lives as long as the process.
+class MainWindow : public ToolkitBlurFrame
+{
+    Q_OBJECT
+
+public:
+    /// Builds everything and starts the timers. Below version 1030 the tray icon is fixed and toggles this window.
+    /// Ends the process when the terminal info file is missing.
+    MainWindow(QWidget* parent, int osVersion);
+    ~MainWindow() override;
+
+    /// Makes the tray icon. Called once, when a tray host is known to be there.
+    void showSystemTrayIcon();
+    /// Whether the tray icon has been made.
+    bool hasSystemTrayIcon() const { return sysTrayIcon != nullptr; }
+
+    /// A random integer in [b, a); b when both are equal. Seeded with the seconds since midnight, so that calls within
+    /// one second give the same number.
+    int generateRandnum(const int& a, const int& b);
+
+    /// The machine's host name.
+    QString getHostName();
+
+    /// Runs a shell command, waits for the end of its output and appends its lines, in pieces of at most 127 bytes, to
+    /// the collected output. 0 on success, −1 for an empty command, −2 or −3 when the pipe cannot be opened or closed;
+    /// the command's own exit status is not returned.
+    int system(const QString& command);
+    /// Everything that system() has collected so far.
+    QList<QString> commandOutputLines() const { return commandOutput; }
+
+    /// Whether the user works under a scene's name.
+    bool isScenceUser();
+    /// Whether "id" shows an administrator of the platform.
+    bool isAdminUser();
+    /// Whether the user comes from the directory; always, in this version.
+    bool isLdapUser();
+
+    /// Reads a user reply's body; 1 when it was good, else 0.
+    int analyseData(QByteArray* body);
+    /// Reads an area reply's body; 1 when it was JSON, else 0.
+    int analyseAreaData(QByteArray* body);
+    /// Reads a scene reply's body; 1 when it was JSON, else 0.
+    int analyseEvnData(QByteArray* body);
+
+    /// Whether this terminal has a terminal info file; its absence is logged.
+    bool whetherJoinGuard();
+    /// Asks the server for the scenes of this user on this terminal.
+    void getAllUserEnvironment();
+    /// Index of the first scene called `name`, −1 when there is none.
+    int getEvncode(const QString& name);
+    /// Records the code of the scene the user works in; a file that cannot be written is skipped.
+    void renewCurrentScene(const QString& scene);
+    /// Starts policy loading for a scene; this version has no command to run.
+    void callloadpolicy(const int& kind, const QString& scene);
+    /// A file's whole content as UTF-8 text; empty, with a log line, when it cannot be opened.
+    QString readScriptsFile(const QString& path);
+
+public slots:
+    void onActivatedSysTrayIcon(QSystemTrayIcon::ActivationReason reason);
+    void dealSysTrayEvent();
+    /// Gives the tray icon the form for a colour type of ThemeHelper.
+    void setSysThemetype(int colorType);
+    void onHideClicked();
+    /// Opens the desktop's shutdown dialog.
+    void onShutdownClicked();
+    /// Takes the client off the screen: no tray icon, no window.
+    void shutdown();
+    /// Ends this program's processes; for users that are not of the directory.
+    void closewindow();
+    /// Ends the process at once, without clean-up.
+    void loadSelf();
+    void onOntopStatechanged();
+    void onLogininfoClicked();
+    void onNetinfoClicked();
+    void toLogininfo();
+    void toNetinfo();
+    /// Fills the current page from the network daemon's answer and from what the server said.
+    void updateNetInfo();
+    void resetUIPos();
+
+    void getusrInfo();
+    void onUserInfo(const int& statusCode, const QString& data);
+    void getAreaInfo();
+    void onCompanyName(const int& statusCode, const QString& data);
+    void analysejson(QNetworkReply* reply);
+    void rcvAreainfoData(QNetworkReply* reply);
+
+    void rcvEvninfoData(QNetworkReply* reply);
+    /// Makes the scene chosen in the panel the current one.
+    void switchUserEvn();
+    /// Puts the panel's scene box back on the current scene.
+    void reverseEvn();
+    /// Loads the policy of the scene that every session starts in.
+    void startPolicy();
+
+signals:
+    void sizeChanged();
+    void newMessage();
+    void readNotify(QString uuid);
+    /// Asks for a refresh of the user data.
+    void startgetMeInfo();
+
+protected:
+    void closeEvent(QCloseEvent* event) override;
+    // The panel's surface takes no part in dragging; the title bar does.
+    void mousePressEvent(QMouseEvent*) override {}
+    void mouseMoveEvent(QMouseEvent*) override {}
+    void mouseReleaseEvent(QMouseEvent*) override {}
+
+private:
+    void createPanel();
+    void connectPanel();
+    void initPlatformMessage();
+    void createManagers();
+    void connectManagementClient();
+    void startInfoTimers();
+    void toggleMessageWindow();
+    void getUserName();
+    void getConfig();
+    TNetInfo networkInfo(const QJsonArray& connections) const;
+    void storeUserData(const zent::UserData& data);
+    void offerScenes(const QStringList& names);
+    /// Follows a change of the panel's height; the window keeps its corner unless the user has moved it.
+    void fitToPanel();
+
+    QList<QString> commandOutput;
+    QNetworkAccessManager* userManager = nullptr;
+    QNetworkAccessManager* areaManager = nullptr;
+    QNetworkAccessManager* sceneManager = nullptr;
+    QList<QPair<QString, QString>> sceneList;
+    bool openMessagetWindow = false;
+    QString userName;
+    QWidget* messageWindow = nullptr;
+    QTimer* userInfoTimer = nullptr;
+    QTimer* areaInfoTimer = nullptr;
+    std::unique_ptr<QTimer> policyTimer;
+    std::unique_ptr<QTimer> posTimer;
+    NetworkDaemonProxy* networkProxy = nullptr;
+    QSystemTrayIcon* sysTrayIcon = nullptr;
+    int infoPage = 0;
+
+    QString clientName;
+    QString organizationName;
+    QString gecosName;
+    QString gecosLast;
+    QString groupName;
+    int userId = 0;
+
+    QString serverHost;
+    QString serverPort;
+    QString isDomain;
+    QString machineId;
+    QString hostName;
+
+    int winstatus = 0;
+    int sceneState = 2;
+    int currentSceneIndex = 0;
+    bool sceneBoxReady = false;
+    QString scenceUserName;
+    int osVersion;
+    ToolkitTitlebar* titlebar = nullptr;
+    InfoWidget* infoWidget = nullptr;
+    bool movedByUser = false;
+};

@@ -1,0 +1,36 @@
+#include "screens.h"
+
+#include <QApplication>
+#include <QDesktopWidget>
+#include <QScreen>
+#include <QWidget>
+
+namespace zent::screens
+{
+
+QRect availableGeometry()
+{
+    QT_WARNING_PUSH
+    QT_WARNING_DISABLE_DEPRECATED
+    return QApplication::desktop()->availableGeometry(-1);
+    QT_WARNING_POP
+}
+
+QRect fullGeometry()
+{
+    const QScreen* screen = QGuiApplication::primaryScreen();
+    return screen ? screen->geometry() : QRect();
+}
+
+QRect primaryAvailableGeometry()
+{
+    const QScreen* screen = QGuiApplication::primaryScreen();
+    return screen ? screen->availableGeometry() : QRect();
+}
+
+void placeBottomRight(QWidget& window, const QRect& area)
+{
+    window.move(area.width() - window.width(), area.height() - window.height());
+}
+
+} // namespace zent::screens

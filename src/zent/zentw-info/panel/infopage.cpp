@@ -1,0 +1,79 @@
+#include "infopage.h"
+
+#include "toolkitlabel.h"
+
+#include <QGridLayout>
+
+namespace
+{
+
+constexpr QSize pageSize(278, 310);
+constexpr QSize captionSize(56, 18);
+constexpr QSize valueSize(170, 18);
+/// The same on every page, so that the values keep their place when the page changes.
+constexpr int captionColumn = 76;
+constexpr int columnGap = 14;
+/// Eight rows at this distance fill the part of the page that the panel shows.
+constexpr int rowGap = 14;
+
+void setTextColor(QWidget* widget, const QColor& color)
+{
+    QPalette palette = widget->palette();
+    palette.setColor(QPalette::WindowText, color);
+    palette.setColor(QPalette::Text, color);
+    widget->setPalette(palette);
+}
+
+} // namespace
+
+InfoPage::InfoPage(const QVector<Row>& rows, QWidget* parent) : QWidget(parent)
+{
+    setFixedSize(pageSize);
+    auto* grid = new QGridLayout(this);
+    grid->setContentsMargins(0, 0, 0, 0);
+    grid->setHorizontalSpacing(columnGap);
+    grid->setVerticalSpacing(rowGap);
+    grid->setColumnMinimumWidth(0, captionColumn);
+    grid->setColumnStretch(1, 1);
+    for (int row = 0; row < rows.size(); ++row) {
+        auto* caption = new ToolkitLabel(rows[row].caption, this);
+        caption->setObjectName(QLatin1String(rows[row].captionName));
+        caption->setFixedSize(captionSize);
+        setTextColor(caption, QColor(0, 0, 0, 150));
+
+        auto* value = new ToolkitLabel(this);
+        value->setObjectName(QLatin1String(rows[row].valueName));
+        value->setFixedSize(valueSize);
+        setTextColor(value, QColor(0, 0, 0, 255));
+        caption->setBuddy(value);
+        caption->makeRoomForDescenders();
+        value->makeRoomForDescenders();
+
+        grid->addWidget(caption, row, 0, Qt::AlignLeft);
+        grid->addWidget(value, row, 1, Qt::AlignLeft);
+        m_captions.append(caption);
+        m_values.append(value);
+        setValue(row, QString(), Overflow::Clip);
+    }
+    // What is left over goes below the last row.
+    grid->setRowStretch(rows.size(), 1);
+}
+
+void InfoPage::setCaptionWidth(int row, int width)
+{
+    m_captions[row]->setFixedWidth(width);
+}
+
+void InfoPage::setValue(int row, const QString& text, Overflow overflow)
+{
+    ToolkitLabel* label = m_values[row];
+    // A screen reader meets the value alone; its name says what the value is, and says it whole.
+    label->setAccessibleName(m_captions[row]->text() + QStringLiteral("：") + text);
+    const QFontMetrics metrics = label->fontMetrics();
+    if (overflow == Overflow::Elide && metrics.horizontalAdvance(text) > label->width()) {
+        label->setText(metrics.elidedText(text, Qt::ElideMiddle, label->width()));
+        label->setToolTip(ToolkitLabel::plainToolTip(text));
+    } else {
+        label->setText(text);
+    }
+}

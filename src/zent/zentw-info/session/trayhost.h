@@ -1,0 +1,37 @@
+#pragma once
+
+#include <QObject>
+
+namespace zent::trayhost
+{
+
+/// Whether a tray icon made now would be shown: a host is there, or there is neither an X display nor a session bus
+/// on which one could appear later. Asks the session bus and waits up to half a second. Calls no tray function of Qt.
+bool canShowIconNow();
+
+} // namespace zent::trayhost
+
+/// Waits for the first tray host of the session, of either protocol, without touching a tray function of Qt: Qt
+/// decides on its first such call, once for the whole process, whether a host exists.
+class TrayHostWatch : public QObject
+{
+    Q_OBJECT
+
+public:
+    /// Starts to watch at once; a host that is already there is announced through the event loop.
+    explicit TrayHostWatch(QObject* parent = nullptr);
+
+signals:
+    /// A host is there. Emitted once; the watch then rests.
+    void hostAppeared();
+
+private slots:
+    void askBus();
+
+private:
+    void watchBus();
+    void watchDisplay();
+    void announce();
+
+    bool m_announced = false;
+};

@@ -1,0 +1,59 @@
+#include "gates.h"
+
+#include "filecontent.h"
+#include "idcommand.h"
+#include "paths.h"
+
+#include <QDebug>
+#include <QFile>
+#include <QStringList>
+
+bool isDomain()
+{
+    QFile file(zent::kUserinfoPath);
+    if (!file.exists() || !file.open(QIODevice::ReadOnly | QIODevice::Text))
+        return false;
+    if (zent::saysInDomain(file.readAll()))
+        return true;
+    qInfo() << "is not Domain!";
+    return false;
+}
+
+bool isLDAPUser()
+{
+    return idCommandOutput().contains(QLatin1String("zent"));
+}
+
+int getMiniVersion()
+{
+    constexpr int kNoVersionFile = 1000;
+    QFile file(zent::kOsVersionPath);
+    if (!file.exists())
+        return kNoVersionFile;
+    if (!file.open(QIODevice::ReadOnly | QIODevice::Text))
+        return -1;
+    return zent::minorVersionIn(QString::fromUtf8(file.readAll()));
+}
+
+namespace zent
+{
+
+bool saysInDomain(const QByteArray& infoFile)
+{
+    const auto object = base::parseInfoObject(infoFile);
+    return object && object->value(base::infokey::kIsDomain) == QJsonValue(true);
+}
+
+int minorVersionIn(const QString& versionFile)
+{
+    int version = -1;
+    for (QString line : versionFile.split(QLatin1Char('\n'))) {
+        if (!line.contains(QLatin1String("MinorVersion")))
+            continue;
+        version = line.remove(QLatin1String("MinorVersion=")).toInt();
+        qDebug() << "nOSVersion:" << version;
+    }
+    return version;
+}
+
+} // namespace zent

@@ -1,0 +1,156 @@
+#include "fileconfig.h"
+
+#include "activeconnections.h"
+#include "dbusnames.h"
+#include "filecontent.h"
+#include "filewrite.h"
+#include "networkdaemonproxy.h"
+#include "paths.h"
+
+#include <QDebug>
+#include <QDir>
+#include <QFile>
+#include <QFileInfo>
+#include <QJsonDocument>
+#include <QJsonObject>
+
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace
+{
+
+namespace infokey = zent::base::infokey;
+
+QUrl httpsUrl(const QString& host, const QString& port, const QString& path)
+{
+    QUrl url;
+    url.setScheme(QStringLiteral("https"));
+    url.setHost(host, QUrl::DecodedMode);
+    url.setPath(path, QUrl::DecodedMode);
+    url.setPort(port.toInt());
+    qDebug() << "url:" << url;
+    return url;
+}
+
+/// Makes the staging directory where it is missing. False when its place is taken by a symbolic link or by another
+/// user's directory: the temporary directory is open to everybody, and what is staged there is believed later.
+bool prepareStagingDirectory(const QString& path)
+{
+    const QByteArray encoded = QFile::encodeName(path);
+    if (mkdir(encoded.constData(), 0755) == 0)
+        return true;
+    struct stat status = {};
+    return lstat(encoded.constData(), &status) == 0 && S_ISDIR(status.st_mode) && status.st_uid == getuid();
+}
+
+} // namespace
+
+FileConfig* FileConfig::GetInstance()
+{
+    static FileConfig instance;
+    return &instance;
+}
+
+FileConfig::FileConfig()
+{
+    readServerConfig(zent::kUserinfoPath);
+}
+
+QUrl FileConfig::getServerUrl(const QString& path) const
+{
+    return httpsUrl(m_serverHost, m_serverPort, path);
+}
+
+QUrl FileConfig::getDomainUrl(const QString& path) const
+{
+    return httpsUrl(m_domainHost, m_domainPort, path);
+}
+
+void FileConfig::readServerConfig(const QString& path)
+{
+    QFile file(path);
+    if (!file.exists()) {
+        qWarning() << " not found userinfo.json";
+        m_terminalName = readHostName();
+        return;
+    }
+    if (!file.open(QIODevice::ReadOnly | QIODevice::Text)) {
+        qWarning() << "fail to open file userinfo.json !";
+        m_terminalName = readHostName();
+        return;
+    }
+    QJsonParseError error;
+    const QJsonDocument document = QJsonDocument::fromJson(file.readAll(), &error);
+    if (error.error != QJsonParseError::NoError) {
+        qWarning() << "userinfo.json Json error";
+        return;
+    }
+    const QJsonObject object = document.object();
+    m_serverHost = object.value(infokey::kServerHost).toString();
+    m_serverPort = object.value(infokey::kServerPort).toString();
+    m_domainHost = object.value(infokey::kDomainHost).toString();
+    m_domainPort = object.value(infokey::kDomainPort).toString();
+    m_terminalName = object.value(infokey::kTerminalName).toString();
+    m_isDomain = object.value(infokey::kIsDomain).toBool();
+}
+
+void FileConfig::writeServerConfig()
+{
+    const QJsonObject object{
+        {infokey::kServerHost, m_serverHost},     {infokey::kServerPort, m_serverPort},
+        {infokey::kDomainHost, m_domainHost},     {infokey::kDomainPort, m_domainPort},
+        {infokey::kTerminalName, m_terminalName}, {infokey::kIsDomain, m_isDomain},
+    };
+    const QByteArray json = QJsonDocument(object).toJson();
+    qDebug() << "FileConfig::writeServerInfo---strConfig:" << json;
+
+    if (prepareStagingDirectory(QFileInfo(zent::kTmpUserinfoPath).path()) &&
+        zent::base::replaceFile(zent::kTmpUserinfoPath, json) == zent::base::WriteResult::Done)
+        qInfo() << "write json success";
+    else
+        qWarning() << "file open error";
+}
+
+QString FileConfig::readHostName() const
+{
+    QFile file(zent::kHostnamePath);
+    if (!file.exists()) {
+        qWarning() << " not found :" << zent::kHostnamePath;
+        return QString();
+    }
+    if (!file.open(QIODevice::ReadOnly | QIODevice::Text)) {
+        qWarning() << " open filed :" << zent::kHostnamePath;
+        return QString();
+    }
+    return QString::fromUtf8(file.readAll()).remove(QLatin1Char('\n'));
+}
+
+QString FileConfig::getMacAddress() const
+{
+    NetworkDaemonProxy daemon(zent::dbus::kNetworkService, zent::dbus::kNetworkPath, QDBusConnection::sessionBus());
+    const std::optional<QString> answer = daemon.activeConnectionInfo();
+    if (!answer) {
+        qCritical() << "GetActiveConnectionInfo error";
+        return QString();
+    }
+    const QJsonArray array = zent::parseConnectionArray(answer->toUtf8()).value_or(QJsonArray());
+    for (const zent::ActiveConnection& connection : zent::activeConnections(array)) {
+        if (connection.primary) {
+            qInfo() << connection.hwAddress;
+            return connection.hwAddress;
+        }
+    }
+    return QString();
+}
+
+void FileConfig::saveCert(const QString& base64Content, const QString& filePath)
+{
+    QDir().mkpath(QFileInfo(filePath).path());
+    QFile file(filePath);
+    if (!file.open(QIODevice::WriteOnly)) {
+        qWarning() << "writeCERT open error! " << filePath;
+        return;
+    }
+    file.write(QByteArray::fromBase64(base64Content.toLatin1()));
+}
