@@ -285,10 +285,9 @@ CURLcode HttpClientApi::Session::perform(const Request& request, QByteArray& rep
         result = curl_easy_perform(m_handle.get());
     if (result == CURLE_OK)
         result = curl_easy_getinfo(m_handle.get(), CURLINFO_RESPONSE_CODE, &status);
-    if (result == CURLE_OK && !buffer.headComplete) {
-        // For curl a connection that ends in the head is an empty reply like any other.
+    // For curl a reply that ends in its head is a complete one with an empty body.
+    if (result == CURLE_OK && !buffer.headComplete)
         result = CURLE_PARTIAL_FILE;
-    }
     if (buffer.tooLarge) {
         m_error[0] = '\0';
         result = CURLE_FILESIZE_EXCEEDED;
@@ -344,11 +343,7 @@ bool HttpClientApi::Session::openHandle()
 void HttpClientApi::Session::dropConnections()
 {
     const SigpipeBlocker blocker;
-    if (m_handle) {
-        // A reset handle would wait for its resolver thread on cleanup.
-        curl_easy_setopt(m_handle.get(), CURLOPT_QUICK_EXIT, 1L);
-        m_handle.reset();
-    }
+    m_handle.reset();
 }
 
 HttpClientApi::HttpClientApi(QObject* parent, bool reserved) : QObject(parent), m_session(std::make_unique<Session>())

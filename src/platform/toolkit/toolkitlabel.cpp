@@ -3,6 +3,7 @@
 #include <QFontInfo>
 #include <QHelpEvent>
 #include <QPainter>
+#include <QStyle>
 #include <QTextDocument>
 #include <QToolTip>
 
@@ -37,10 +38,17 @@ void ToolkitLabel::shrinkFontToWidth()
         setFont(smaller);
 }
 
-void ToolkitLabel::makeRoomForDescenders()
+int ToolkitLabel::baseline() const
 {
-    // The text is centred in, and clipped by, what the margins leave: a margin at the bottom would cut it there.
-    setContentsMargins(0, -2, 0, 0);
+    const QRect area = contentsRect();
+    const QFontMetrics metrics = fontMetrics();
+    int line = style()->itemTextRect(metrics, area, int(alignment()), true, text()).top() + metrics.ascent();
+    // Measured on glyphs that reach low and high, not on the text, so that neighbouring labels keep one baseline.
+    const int low = line + metrics.tightBoundingRect(QStringLiteral("gj()")).bottom() - area.bottom();
+    const int high = line + metrics.tightBoundingRect(QStringLiteral("年国(")).top() - area.top();
+    if (low > 0)
+        line -= qBound(0, low, qMax(0, high));
+    return line;
 }
 
 bool ToolkitLabel::event(QEvent* event)
@@ -57,25 +65,42 @@ bool ToolkitLabel::overflows() const
     return !wordWrap() && fontMetrics().size(0, text()).width() > contentsRect().width();
 }
 
+void ToolkitLabel::drawLine(QPainter& painter) const
+{
+    const QRect area = contentsRect();
+    const Qt::Alignment side = QStyle::visualAlignment(layoutDirection(), alignment());
+    const int slack = area.width() - fontMetrics().horizontalAdvance(text());
+    int x = area.left();
+    if (slack > 0 && (side & Qt::AlignHCenter))
+        x += slack / 2;
+    else if (slack > 0 && (side & Qt::AlignRight))
+        x += slack;
+    painter.drawText(x, baseline(), text());
+}
+
 void ToolkitLabel::paintEvent(QPaintEvent* event)
 {
-    if (!overflows())
+    if (text().isEmpty() || wordWrap() || text().contains(QLatin1Char('\n')))
         return QLabel::paintEvent(event);
     constexpr int slices = 14;
     constexpr int sliceWidth = 2;
-    const QRect area = contentsRect();
-    const int fadeStart = area.right() + 1 - slices * sliceWidth;
-    QColor color = palette().color(isEnabled() ? QPalette::Active : QPalette::Disabled, foregroundRole());
-    const int alpha = color.alpha();
     QPainter painter(this);
+    QColor color = palette().color(isEnabled() ? QPalette::Active : QPalette::Disabled, foregroundRole());
+    painter.setPen(color);
+    if (!overflows())
+        return drawLine(painter);
+
     // In slices: a gradient pen draws glyphs as outlines, and a layer blends them differently; both look bolder than
     // the text around.
+    const QRect area = contentsRect();
+    const int fadeStart = area.right() + 1 - slices * sliceWidth;
+    const int alpha = color.alpha();
     for (int slice = 0; slice <= slices; ++slice) {
         const QRect body(area.left(), area.top(), fadeStart - area.left(), area.height());
         const QRect piece(fadeStart + (slice - 1) * sliceWidth, area.top(), sliceWidth, area.height());
         painter.setClipRect(slice == 0 ? body : piece);
         color.setAlpha(alpha * (slices - slice) / slices);
         painter.setPen(color);
-        painter.drawText(area, Qt::AlignLeft | Qt::AlignVCenter, text());
+        drawLine(painter);
     }
 }

@@ -20,8 +20,9 @@ public:
     /// Makes the font smaller, in whole pixels and to no less than 8, until the text fits the label's width.
     void shrinkFontToWidth();
 
-    /// Raises the text by a pixel, for a label lower than its font's line, so that descenders are not cut off.
-    void makeRoomForDescenders();
+    /// The y coordinate of a single line's baseline. Where the label is lower than the font's line, the line is
+    /// raised so that descenders are not cut off.
+    int baseline() const;
 
 protected:
     bool event(QEvent* event) override;
@@ -29,4 +30,5 @@ protected:
 
 private:
     bool overflows() const;
+    void drawLine(QPainter& painter) const;
 };

@@ -11,12 +11,10 @@
 
 class InfoWidget;
 class NetworkDaemonProxy;
-class QJsonArray;
 class QNetworkAccessManager;
 class QNetworkReply;
 class QTimer;
 class ToolkitTitlebar;
-struct TNetInfo;
 
 namespace zent
 {
@@ -143,7 +141,6 @@ private:
     void toggleMessageWindow();
     void getUserName();
     void getConfig();
-    TNetInfo networkInfo(const QJsonArray& connections) const;
     void storeUserData(const zent::UserData& data);
     void offerScenes(const QStringList& names);
     /// Follows a change of the panel's height; the window keeps its corner unless the user has moved it.

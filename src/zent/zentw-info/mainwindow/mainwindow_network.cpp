@@ -46,20 +46,19 @@ void MainWindow::updateNetInfo()
     // Without an answer both pages keep what they show.
     if (!array)
         return;
-    if (infoPage == kLoginPage)
+    if (infoPage == kLoginPage) {
         infoWidget->setLoginInfo({clientName, organizationName, gecosName, gecosLast, QString(), groupName});
-    else if (infoPage == kNetworkPage)
-        infoWidget->setNetInfo(networkInfo(*array));
-}
-
-TNetInfo MainWindow::networkInfo(const QJsonArray& connections) const
-{
+        return;
+    }
+    if (infoPage != kNetworkPage)
+        return;
     TNetInfo info;
     info.hostName = hostName;
     info.userName = userName;
     qDebug() << "updateNetInfo"
-             << "array----:" << connections;
-    for (const zent::ActiveConnection& connection : zent::activeConnections(connections)) {
+             << "array----:" << *array;
+    // A later primary connection overwrites an earlier one.
+    for (const zent::ActiveConnection& connection : zent::activeConnections(*array)) {
         if (!connection.primary)
             continue;
         qDebug() << "updateNetInfo"
@@ -71,5 +70,5 @@ TNetInfo MainWindow::networkInfo(const QJsonArray& connections) const
         info.subnetMask = connection.mask;
         info.speed = connection.speed;
     }
-    return info;
+    infoWidget->setNetInfo(info);
 }

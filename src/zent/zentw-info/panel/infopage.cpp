@@ -46,8 +46,6 @@ InfoPage::InfoPage(const QVector<Row>& rows, QWidget* parent) : QWidget(parent)
         value->setFixedSize(valueSize);
         setTextColor(value, QColor(0, 0, 0, 255));
         caption->setBuddy(value);
-        caption->makeRoomForDescenders();
-        value->makeRoomForDescenders();
 
         grid->addWidget(caption, row, 0, Qt::AlignLeft);
         grid->addWidget(value, row, 1, Qt::AlignLeft);

@@ -84,13 +84,11 @@ void InfoWidget::createDateLabels()
     m_date = new ToolkitLabel(this);
     m_date->setObjectName(QStringLiteral("dateTimeLabel"));
     m_date->setFixedSize(200, 20);
-    m_date->makeRoomForDescenders();
 
     m_lunarDate = new ToolkitLabel(this);
     m_lunarDate->setObjectName(QStringLiteral("CdateTimeLabel"));
     m_lunarDate->setLayoutDirection(Qt::LeftToRight);
     m_lunarDate->setFixedSize(200, 16);
-    m_lunarDate->makeRoomForDescenders();
 }
 
 void InfoWidget::createSceneBox()

@@ -1,4 +1,5 @@
 #include "gates.h"
+#include "sessionlocale.h"
 #include "log.h"
 #include "mainwindow.h"
 #include "screens.h"
@@ -16,9 +17,10 @@ constexpr int kOsVersion = 1020;
 
 int main(int argc, char* argv[])
 {
+    zent::initLocale();
     zent::uOpenlog(zent::LEVEL_DEBUG);
     // Qt's bearer thread would otherwise wake up every ten seconds for as long as the client runs.
-    qputenv("QT_BEARER_POLL_TIMEOUT", "-1");
+    qputenv("QT_BEARER_POLL_TIMEOUT", "2147483647");
 
     ToolkitApplication::loadPlatformPlugin();
     ToolkitApplication application(argc, argv);

@@ -1,0 +1,111 @@
+"""The tray icon and the panel on a real X server with a real tray host and window manager."""
+
+import re
+
+from clienttest import ClientTest, roomclient, unittest
+
+SCREEN = (1280, 800)
+ON_TOP_BOX = (20, -32)
+
+
+class Tray(ClientTest):
+    def test_three_left_clicks(self):
+        self.start()
+        self.desktop.click_icon()
+        roomclient.wait_syslog("winstatus :  0")
+        self.assertIsNone(self.desktop.panel())
+        self.desktop.click_icon()
+        self.desktop.wait("the panel", self.desktop.panel)
+        self.desktop.click_icon()
+        self.wait_hidden()
+
+    def test_right_click_makes_the_next_left_click_show(self):
+        self.start_shown()
+        self.desktop.click_icon(button=3)
+        roomclient.wait_for(lambda: sum("reason : 1" in line for line in roomclient.syslog_lines()) == 2)
+        self.desktop.click_icon()
+        roomclient.wait_for(lambda: sum("reason : 3" in line for line in roomclient.syslog_lines()) == 2)
+        self.assertIsNotNone(self.desktop.panel())
+
+    def test_double_click_counts_once_and_middle_click_not_at_all(self):
+        self.start()
+        self.desktop.click_icon(repeat=2)
+        roomclient.wait_syslog("reason : 2")
+        self.desktop.click_icon(button=2)
+        roomclient.wait_syslog("reason : 4")
+        self.assertEqual(sum("winstatus" in line for line in roomclient.syslog_lines()), 1)
+
+    def test_closing_by_the_window_manager_hides(self):
+        panel = self.start_shown()
+        self.desktop.run("wmctrl", "-i", "-c", panel)
+        self.wait_hidden()
+        roomclient.wait_syslog("closeEvent --------")
+        self.assertIsNone(self.client.poll())
+        self.desktop.click_icon()
+        self.desktop.wait("the panel", self.desktop.panel)
+
+    def test_host_that_restarts(self):
+        self.start()
+        tint2 = self.desktop.processes[2]
+        tint2.terminate()
+        tint2.wait(5)
+        self.desktop.start_tray()
+        self.desktop.wait("the icon in the new tray", self.desktop.icon)
+
+
+class Panel(ClientTest):
+    def test_place_and_frame(self):
+        panel = self.start_shown()
+        self.until("the panel with its scenes", lambda: self.desktop.geometry(panel)[3] == 565)
+        x, y, width, height = self.desktop.geometry(panel)
+        # The tray host reserves 36 pixels along the bottom.
+        self.assertEqual((x + width, y + height), (SCREEN[0], SCREEN[1] - 36))
+        self.assertNotIn("_NET_FRAME_EXTENTS(CARDINAL) = 1", self.desktop.run("xprop", "-id", panel))
+
+    def test_on_top_keeps_the_panel_frameless_and_visible(self):
+        panel = self.start_shown()
+        self.until("the panel with its scenes", lambda: self.desktop.geometry(panel)[3] == 565)
+        for state in (True, False):
+            x, y, _, height = self.desktop.geometry(self.desktop.panel())
+            self.desktop.click(x + ON_TOP_BOX[0], y + height + ON_TOP_BOX[1])
+
+            def settled(wanted=state):
+                window = self.desktop.panel()
+                text = self.desktop.run("xprop", "-id", window) if window else ""
+                return "_NET_FRAME_EXTENTS" in text and ("_NET_WM_STATE_ABOVE" in text) == wanted and text
+
+            text = self.until("the window state", settled)
+            self.assertRegex(text, r"_NET_FRAME_EXTENTS\(CARDINAL\) = 0, 0, 0, 0")
+
+    def test_close_button_and_dragging(self):
+        panel = self.start_shown()
+        self.until("the panel with its scenes", lambda: self.desktop.geometry(panel)[3] == 565)
+        x, y, width, _ = self.desktop.geometry(panel)
+        self.desktop.run("xdotool", "mousemove", str(x + 100), str(y + 20), "mousedown", "1",
+                         "mousemove_relative", "--sync", "--", "-150", "-60",
+                         "mousemove_relative", "--sync", "--", "-50", "-40", "mouseup", "1")
+        self.until("the panel to move", lambda: self.desktop.geometry(panel)[:2] == (x - 200, y - 100))
+        self.desktop.click_panel(width - 24, 24)
+        self.wait_hidden()
+        self.assertIsNone(self.client.poll())
+
+
+class LateTray(ClientTest):
+    tray = False
+
+    def test_host_that_comes_after_the_client(self):
+        self.start()
+        self.assertFalse(any("showSystemTrayIcon" in line for line in roomclient.syslog_lines()))
+        self.desktop.start_tray()
+        self.desktop.wait("the tray icon", self.desktop.icon, 2)
+        self.assertIsNone(self.client.poll())
+
+    def test_without_any_host_the_client_lives(self):
+        self.start()
+        roomclient.wait_record(lambda entry: entry.get("path") == "/api/client/area/scenes", 15)
+        self.assertIsNone(self.client.poll())
+        self.assertTrue(re.search(r"resetUIPos", "\n".join(self.messages())))
+
+
+if __name__ == "__main__":
+    unittest.main()
