@@ -2,6 +2,7 @@
 
 #include "infopage.h"
 #include "lunarcalendar.h"
+#include "screens.h"
 #include "themehelper.h"
 #include "toolkitbuttonbox.h"
 #include "toolkitcombobox.h"
@@ -13,10 +14,8 @@
 #include <QDateTime>
 #include <QDebug>
 #include <QFrame>
-#include <QGuiApplication>
 #include <QHBoxLayout>
 #include <QLocale>
-#include <QScreen>
 #include <QTimer>
 #include <QVBoxLayout>
 
@@ -285,8 +284,7 @@ void InfoWidget::initTimer()
 
 void InfoWidget::initUIPos()
 {
-    const QSize screen = QGuiApplication::primaryScreen()->geometry().size();
-    window()->move(screen.width() - window()->width(), screen.height() - window()->height());
+    zent::screens::placeBottomRight(*window(), zent::screens::fullGeometry());
 }
 
 void InfoWidget::onButtonClicked(QAbstractButton* button)
