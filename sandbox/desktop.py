@@ -72,8 +72,11 @@ class Desktop:
         return result.stdout if result.returncode == 0 else ""
 
     def start_window_manager(self):
-        self.spawn(["openbox"])
-        self.wait("the window manager", lambda: "window id" in self.run("xprop", "-root", "_NET_SUPPORTING_WM_CHECK"))
+        # Windows that come while openbox is still starting may be lost, though its properties are on the root already.
+        ready = os.path.join(os.environ["ROOM"], "wm" + self.env["DISPLAY"])
+        self.spawn(["openbox", "--startup", "touch " + ready])
+        self.wait("the window manager", lambda: os.path.exists(ready))
+        os.remove(ready)
 
     def start_tray(self):
         process = self.spawn(["tint2", "-c", os.path.join(HERE, "tint2rc")])

@@ -32,7 +32,8 @@ def environment(options):
         "GSETTINGS_SCHEMA_DIR": f"{ROOM}/schemas", "GSETTINGS_BACKEND": "keyfile",
     })
     if not options.chinese_locale:
-        result["LOCPATH"] = f"{ROOM}/locale"
+        # LC_CTYPE alone would leave programs with the C locale: setlocale(LC_ALL, "") fails when LANG is not to be had.
+        result.update({"LC_CTYPE": "C.UTF-8", "LOCPATH": f"{ROOM}/locale"})
     if options.x11:
         result["DISPLAY"] = options.display
         result["XAUTHORITY"] = f"{ROOM}/Xauthority"
