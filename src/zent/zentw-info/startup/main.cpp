@@ -1,9 +1,9 @@
 #include "gates.h"
-#include "sessionlocale.h"
 #include "log.h"
 #include "mainwindow.h"
 #include "screens.h"
 #include "sessionhost.h"
+#include "sessionlocale.h"
 #include "signalquit.h"
 #include "toolkitapplication.h"
 
