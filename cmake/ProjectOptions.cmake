@@ -14,6 +14,8 @@ include(CheckPIESupported)
 check_pie_supported()
 
 add_compile_options(-Wall -Wextra -Wpedantic)
+# Where the tree lies on the machine that builds it is nobody's business.
+add_compile_options(-ffile-prefix-map=${CMAKE_SOURCE_DIR}/=)
 # Release builds would otherwise lose file, line and function from every log line.
 add_compile_definitions(QT_MESSAGELOGCONTEXT QT_NO_CAST_TO_ASCII QT_NO_URL_CAST_FROM_STRING)
 

@@ -23,6 +23,9 @@ inline const QString kPrivateKeyPath = QStringLiteral("/etc/zent/.QEL_Zent.key")
 /// Where the server keeps the rule for terminal names; %1 host, %2 port.
 inline const QString kPCRegular = QStringLiteral("https://%1:%2/uim/v3/client/config?key=pc_name_rules");
 
+/// What the desktop looked like before the terminal joined management.
+inline const QString kBackupConfigPath = QStringLiteral("/etc/zent/config.ini");
+
 /// The host name, in the desktop's own file.
 inline const QString kHostnamePath = QStringLiteral("/etc/hostname");
 /// Version file of the operating system.

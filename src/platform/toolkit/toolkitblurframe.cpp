@@ -1,32 +1,11 @@
 #include "toolkitblurframe.h"
 
+#include "roundedsurface.h"
 #include "themehelper.h"
 #include "windowmanagerhelper.h"
 
 #include <KWindowEffects>
-#include <QPainter>
 #include <QWindow>
-
-#include <cmath>
-
-namespace
-{
-
-QRegion roundedRegion(const QRect& rect, int radius)
-{
-    // Row by row: a region made from a path's polygon has visibly cut corners.
-    QRegion region(rect.adjusted(0, radius, 0, -radius));
-    for (int row = 0; row < radius; ++row) {
-        const qreal height = radius - row - 0.5;
-        const int inset = qRound(radius - std::sqrt(qreal(radius) * radius - height * height));
-        const QRect line(rect.left() + inset, rect.top() + row, rect.width() - 2 * inset, 1);
-        region += line;
-        region += line.translated(0, rect.height() - 1 - 2 * row);
-    }
-    return region;
-}
-
-} // namespace
 
 ToolkitBlurFrame::ToolkitBlurFrame(QWidget* parent)
     : QWidget(parent), m_maskColor(ThemeHelper::palette(ThemeHelper::LightType).color(QPalette::Window))
@@ -81,11 +60,7 @@ void ToolkitBlurFrame::updateShape()
 {
     if (!isWindow())
         return;
-    m_composited = WindowManagerHelper::instance()->hasComposite();
-    if (m_composited)
-        clearMask();
-    else
-        setMask(roundedRegion(rect(), m_radius));
+    m_composited = roundedsurface::applyShape(this, m_radius);
     updateBlur();
 }
 
@@ -96,7 +71,8 @@ void ToolkitBlurFrame::updateBlur()
     if (!WindowManagerHelper::instance()->hasBlurWindow())
         return;
     const bool wanted = m_maskAlpha < 255;
-    KWindowEffects::enableBlurBehind(windowHandle(), wanted, wanted ? roundedRegion(rect(), m_radius) : QRegion());
+    KWindowEffects::enableBlurBehind(windowHandle(), wanted,
+                                     wanted ? roundedsurface::region(rect(), m_radius) : QRegion());
 }
 
 void ToolkitBlurFrame::paintEvent(QPaintEvent*)
@@ -105,18 +81,8 @@ void ToolkitBlurFrame::paintEvent(QPaintEvent*)
     if (isWindow() && m_composited != WindowManagerHelper::instance()->hasComposite())
         QMetaObject::invokeMethod(this, &ToolkitBlurFrame::updateShape, Qt::QueuedConnection);
 
-    QPainter painter(this);
-    painter.setRenderHint(QPainter::Antialiasing);
+    const bool cut = isWindow() && !m_composited;
     QColor fill = m_maskColor;
-    fill.setAlpha(isWindow() && !m_composited ? 255 : m_maskAlpha);
-    painter.setPen(Qt::NoPen);
-    painter.setBrush(fill);
-    // Cut to shape, nothing lies behind the corners that half-covered pixels could blend with.
-    if (isWindow() && !m_composited)
-        painter.fillRect(rect(), fill);
-    else
-        painter.drawRoundedRect(rect(), m_radius, m_radius);
-    painter.setPen(m_maskColor.lightness() < 128 ? QColor(255, 255, 255, 40) : QColor(0, 0, 0, 40));
-    painter.setBrush(Qt::NoBrush);
-    painter.drawRoundedRect(QRectF(rect()).adjusted(0.5, 0.5, -0.5, -0.5), m_radius - 0.5, m_radius - 0.5);
+    fill.setAlpha(cut ? 255 : m_maskAlpha);
+    roundedsurface::paint(this, fill, m_radius, cut);
 }

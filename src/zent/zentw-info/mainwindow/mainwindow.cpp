@@ -6,6 +6,8 @@
 #include "legacyqt.h"
 #include "loginname.h"
 #include "networkdaemonproxy.h"
+#include "noticedialog.h"
+#include "notification.h"
 #include "replies.h"
 #include "screens.h"
 #include "toolkittitlebar.h"
@@ -57,6 +59,7 @@ MainWindow::MainWindow(QWidget* parent, int osVersion)
     connect(policyTimer.get(), &QTimer::timeout, this, &MainWindow::startPolicy);
     policyTimer->start(generateRandnum(kPolicyLatestMs, kPolicyEarliestMs));
     getUserName();
+    createNoticeDialog();
     getConfig();
     createPanel();
     // An icon made before the desktop's tray host has registered would never appear there, so until then it waits.
@@ -82,6 +85,7 @@ MainWindow::~MainWindow()
         delete member;
         member = nullptr;
     };
+    remove(noticeDialog);
     remove(messageWindow);
     remove(networkProxy);
     remove(userManager);
@@ -137,9 +141,12 @@ void MainWindow::fitToPanel()
         zent::screens::placeBottomRight(*this, zent::screens::availableGeometry());
 }
 
-void MainWindow::initPlatformMessage()
+void MainWindow::createNoticeDialog()
 {
-    connect(this, &MainWindow::startgetMeInfo, this, &MainWindow::getusrInfo);
+    if (!QNotification::qInstance)
+        QNotification::qInstance = new QNotification;
+    noticeDialog = new NoticeDialog(userName, this);
+    noticeDialog->setWindowFlags(noticeDialog->windowFlags() | Qt::WindowStaysOnTopHint);
 }
 
 void MainWindow::createManagers()

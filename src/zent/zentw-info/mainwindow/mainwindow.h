@@ -7,10 +7,12 @@
 #include <QString>
 #include <QSystemTrayIcon>
 
+#include <functional>
 #include <memory>
 
 class InfoWidget;
 class NetworkDaemonProxy;
+class NoticeDialog;
 class QNetworkAccessManager;
 class QNetworkReply;
 class QTimer;
@@ -33,10 +35,16 @@ public:
     MainWindow(QWidget* parent, int osVersion);
     ~MainWindow() override;
 
+    /// The last known number of unread messages, for the whole process.
+    static int unreadMessageCount;
+
     /// Makes the tray icon. Called once, when a tray host is known to be there.
     void showSystemTrayIcon();
     /// Whether the tray icon has been made.
     bool hasSystemTrayIcon() const { return sysTrayIcon != nullptr; }
+
+    /// Shows a message beside the tray icon; a click on it opens the notice dialog. False without an icon.
+    bool showTrayBalloon(const QString& title, const QString& text);
 
     /// A random integer in [b, a); b when both are equal. Seeded with the seconds since midnight, so that calls within
     /// one second give the same number.
@@ -74,6 +82,11 @@ public:
     int getEvncode(const QString& name);
     /// Records the code of the scene the user works in; a file that cannot be written is skipped.
     void renewCurrentScene(const QString& scene);
+    /// Asks for the number of unread messages once, without announcing it.
+    void initUnreadMessageCount();
+    /// Takes one message off the count and off the panel's text.
+    void readOneUnreadMessage();
+
     /// Starts policy loading for a scene; this version has no command to run.
     void callloadpolicy(const int& kind, const QString& scene);
     /// A file's whole content as UTF-8 text; empty, with a log line, when it cannot be opened.
@@ -117,6 +130,18 @@ public slots:
     /// Loads the policy of the scene that every session starts in.
     void startPolicy();
 
+    /// Asks for the number of unread messages, announces a change, and sets the time of the next poll.
+    void unreadMessages();
+    /// One message was read elsewhere.
+    void onReadListMessage(const QString& uuid);
+    /// All messages were read elsewhere.
+    void onReadAllMessage();
+    void onCloseMessageWinDow();
+    void onNoticeReadbuttonClicked();
+    void onNoticeNextbuttonClicked();
+    /// Opens the notice dialog on the newest unread message, if there is one.
+    void openNotice();
+
 signals:
     void sizeChanged();
     void newMessage();
@@ -134,7 +159,10 @@ protected:
 private:
     void createPanel();
     void connectPanel();
+    void createNoticeDialog();
     void initPlatformMessage();
+    void askUnread(const std::function<void(int total)>& counted);
+    void refreshOpenNotice();
     void createManagers();
     void connectManagementClient();
     void startInfoTimers();
@@ -153,9 +181,11 @@ private:
     QList<QPair<QString, QString>> sceneList;
     bool openMessagetWindow = false;
     QString userName;
+    NoticeDialog* noticeDialog = nullptr;
     QWidget* messageWindow = nullptr;
     QTimer* userInfoTimer = nullptr;
     QTimer* areaInfoTimer = nullptr;
+    std::unique_ptr<QTimer> unreadTimer;
     std::unique_ptr<QTimer> policyTimer;
     std::unique_ptr<QTimer> posTimer;
     NetworkDaemonProxy* networkProxy = nullptr;

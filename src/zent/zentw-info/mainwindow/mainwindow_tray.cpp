@@ -34,6 +34,15 @@ void MainWindow::showSystemTrayIcon()
     sysTrayIcon->show();
 }
 
+bool MainWindow::showTrayBalloon(const QString& title, const QString& text)
+{
+    if (!sysTrayIcon)
+        return false;
+    connect(sysTrayIcon, &QSystemTrayIcon::messageClicked, this, &MainWindow::openNotice, Qt::UniqueConnection);
+    sysTrayIcon->showMessage(title, text);
+    return true;
+}
+
 void MainWindow::setSysThemetype(int colorType)
 {
     const bool dark = colorType == ThemeHelper::DarkType;

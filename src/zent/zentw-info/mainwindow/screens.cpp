@@ -33,4 +33,10 @@ void placeBottomRight(QWidget& window, const QRect& area)
     window.move(area.width() - window.width(), area.height() - window.height());
 }
 
+void placeCentre(QWidget& window)
+{
+    const QRect screen = fullGeometry();
+    window.move(screen.width() / 2 - window.width() / 2, screen.height() / 2 - window.height() / 2);
+}
+
 } // namespace zent::screens

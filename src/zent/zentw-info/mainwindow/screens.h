@@ -21,4 +21,7 @@ QRect primaryAvailableGeometry();
 /// top-left corner plays no part: sites with a panel at the left or top rely on where the window then stands.
 void placeBottomRight(QWidget& window, const QRect& area);
 
+/// Moves `window` to the middle of the primary screen, each half rounded toward zero.
+void placeCentre(QWidget& window);
+
 } // namespace zent::screens

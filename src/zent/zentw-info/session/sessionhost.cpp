@@ -1,14 +1,78 @@
 #include "sessionhost.h"
 
+#include "dbusnames.h"
+#include "desktopnotifier.h"
 #include "httprequest.h"
+#include "loginname.h"
 #include "mainwindow.h"
+#include "notify.h"
 #include "replies.h"
 #include "trayhost.h"
 
-SessionHost::SessionHost(MainWindow& window, QObject* parent) : QObject(parent), m_window(window)
+#include <QDBusConnection>
+#include <QDBusError>
+#include <QDebug>
+
+namespace
+{
+
+/// Whether a message pushed to `username` is for the session's user; one that names nobody is for everybody.
+bool isForSessionUser(const QString& username)
+{
+    const QString login = sessionLoginName();
+    return username.isEmpty() || username == login || username == QString(login).remove(QLatin1Char('@'));
+}
+
+} // namespace
+
+SessionHost::SessionHost(MainWindow& window, QObject* parent)
+    : QObject(parent), m_window(window), m_notification(new Notification(this)), m_notifier(new DesktopNotifier(this))
 {
     showTrayIconWhenHosted();
     askScenesAfterOrganisation();
+    showPushedMessages();
+    exportOnSessionBus();
+}
+
+SessionHost::~SessionHost()
+{
+    QDBusConnection bus = QDBusConnection::sessionBus();
+    bus.unregisterObject(zent::dbus::kNotificationPath);
+    bus.unregisterService(zent::dbus::kClientService);
+}
+
+void SessionHost::exportOnSessionBus()
+{
+    QDBusConnection bus = QDBusConnection::sessionBus();
+    constexpr auto kOwnMembersOnly = QDBusConnection::ExportScriptableSlots | QDBusConnection::ExportScriptableSignals;
+    // The objects first: whoever waits for the name finds them behind it.
+    if (!bus.registerObject(zent::dbus::kNotificationPath, m_notification, kOwnMembersOnly))
+        qWarning() << "SessionHost"
+                   << "cannot export" << zent::dbus::kNotificationPath << bus.lastError().message();
+    if (!bus.registerService(zent::dbus::kClientService))
+        qWarning() << "SessionHost"
+                   << "cannot own" << zent::dbus::kClientService << bus.lastError().message();
+}
+
+void SessionHost::showPushedMessages()
+{
+    connect(m_notification, &Notification::onMessage, this,
+            [this](int, const QString& username, const QString& title, const QString& message, const QString& sender) {
+                if (isForSessionUser(username))
+                    m_notifier->notify(title, sender, message);
+                else
+                    qInfo() << "SessionHost"
+                            << "message for another user not shown";
+            });
+    connect(m_notifier, &DesktopNotifier::activated, &m_window, &MainWindow::openNotice);
+    connect(m_notifier, &DesktopNotifier::unavailable, this, &SessionHost::showAsBalloon);
+}
+
+void SessionHost::showAsBalloon(const QString& title, const QString& sender, const QString& text)
+{
+    if (!m_window.showTrayBalloon(title, DesktopNotifier::body(sender, text)))
+        qWarning() << "SessionHost"
+                   << "neither a notification service nor a tray shows the message";
 }
 
 void SessionHost::showTrayIconWhenHosted()

@@ -1,0 +1,189 @@
+#include "toolkitpasswordedit.h"
+
+#include <QAbstractButton>
+#include <QKeyEvent>
+#include <QPainter>
+#include <QPainterPath>
+#include <QX11Info>
+
+#include <cstdlib>
+#include <memory>
+#include <xcb/xcb.h>
+
+namespace
+{
+
+constexpr int signSize = 28;
+constexpr int signInset = 4;
+
+/// Whether Caps Lock is on, as far as an X server can tell.
+bool capsLockOn()
+{
+    if (!QX11Info::isPlatformX11())
+        return false;
+    xcb_connection_t* connection = QX11Info::connection();
+    const xcb_query_pointer_cookie_t cookie = xcb_query_pointer(connection, QX11Info::appRootWindow());
+    const std::unique_ptr<xcb_query_pointer_reply_t, decltype(&std::free)> reply(
+        xcb_query_pointer_reply(connection, cookie, nullptr), &std::free);
+    return reply && (reply->mask & XCB_MOD_MASK_LOCK);
+}
+
+/// An eye; struck through while it is checked, that is, while pressing it hides the text again.
+class EyeButton : public QAbstractButton
+{
+public:
+    explicit EyeButton(QWidget* parent) : QAbstractButton(parent)
+    {
+        setObjectName(QStringLiteral("echoButton"));
+        setCheckable(true);
+        setFocusPolicy(Qt::TabFocus);
+        setCursor(Qt::ArrowCursor);
+        setAttribute(Qt::WA_Hover);
+        resize(signSize, signSize);
+    }
+
+protected:
+    void paintEvent(QPaintEvent*) override
+    {
+        QPainter painter(this);
+        painter.setRenderHint(QPainter::Antialiasing);
+        QColor ink = palette().color(QPalette::Text);
+        if (hasFocus() && window()->testAttribute(Qt::WA_KeyboardFocusChange)) {
+            painter.setPen(QPen(palette().color(QPalette::Link), 2));
+            painter.drawRoundedRect(QRectF(rect()).adjusted(2, 2, -2, -2), 5, 5);
+        }
+        ink.setAlpha(underMouse() || isDown() ? 230 : 160);
+        painter.setPen(QPen(ink, 1.4, Qt::SolidLine, Qt::RoundCap));
+        painter.translate(QRectF(rect()).center());
+        QPainterPath lids(QPointF(-7, 0));
+        lids.quadTo(QPointF(0, -9), QPointF(7, 0));
+        lids.quadTo(QPointF(0, 9), QPointF(-7, 0));
+        painter.drawPath(lids);
+        painter.drawEllipse(QPointF(0, 0), 2, 2);
+        if (isChecked())
+            painter.drawLine(QPointF(-5.5, 5.5), QPointF(5.5, -5.5));
+    }
+};
+
+/// The sign of the Caps Lock key: an arrow up over a bar.
+class CapsLockSign : public QWidget
+{
+public:
+    explicit CapsLockSign(QWidget* parent) : QWidget(parent)
+    {
+        setObjectName(QStringLiteral("capsLockSign"));
+        setCursor(Qt::ArrowCursor);
+        setAccessibleName(QStringLiteral("大写锁定已打开"));
+        setToolTip(QStringLiteral("大写锁定已打开"));
+        resize(signSize, signSize);
+        hide();
+    }
+
+protected:
+    void paintEvent(QPaintEvent*) override
+    {
+        QPainter painter(this);
+        painter.setRenderHint(QPainter::Antialiasing);
+        painter.setPen(QPen(palette().color(QPalette::Text), 1.4, Qt::SolidLine, Qt::RoundCap, Qt::RoundJoin));
+        painter.translate(QRectF(rect()).center());
+        painter.drawPolygon(QPolygonF({QPointF(0, -6), QPointF(6, 0), QPointF(3, 0), QPointF(3, 3), QPointF(-3, 3),
+                                       QPointF(-3, 0), QPointF(-6, 0)}));
+        painter.drawLine(QPointF(-3, 6), QPointF(3, 6));
+    }
+};
+
+} // namespace
+
+ToolkitPasswordEdit::ToolkitPasswordEdit(QWidget* parent)
+    : ToolkitLineEdit(parent), m_echoButton(new EyeButton(this)), m_capsSign(new CapsLockSign(this))
+{
+    setDragEnabled(false);
+    connect(m_echoButton, &QAbstractButton::toggled, this, &ToolkitPasswordEdit::setRevealed);
+    setRevealed(false);
+    arrange();
+}
+
+void ToolkitPasswordEdit::setEchoButtonVisible(bool visible)
+{
+    m_echoButtonVisible = visible;
+    m_echoButton->setVisible(visible);
+    if (!visible)
+        m_echoButton->setChecked(false);
+    arrange();
+}
+
+void ToolkitPasswordEdit::setRevealed(bool revealed)
+{
+    setEchoMode(revealed ? QLineEdit::Normal : QLineEdit::Password);
+    // A visible password is still one: input methods must not learn it.
+    setAttribute(Qt::WA_InputMethodEnabled, false);
+    setInputMethodHints((revealed ? Qt::ImhNone : Qt::ImhHiddenText) | Qt::ImhSensitiveData | Qt::ImhNoPredictiveText |
+                        Qt::ImhNoAutoUppercase);
+    const QString name = revealed ? QStringLiteral("隐藏密码") : QStringLiteral("显示密码");
+    m_echoButton->setAccessibleName(name);
+    m_echoButton->setToolTip(name);
+}
+
+void ToolkitPasswordEdit::updateCapsLock()
+{
+    const bool shown = hasFocus() && capsLockOn();
+    if (shown == m_capsSign->isVisibleTo(this))
+        return;
+    m_capsSign->setVisible(shown);
+    arrange();
+}
+
+void ToolkitPasswordEdit::arrange()
+{
+    int right = width() - signInset;
+    for (QWidget* sign : {static_cast<QWidget*>(m_echoButton), m_capsSign}) {
+        if (!sign->isVisibleTo(this))
+            continue;
+        right -= sign->width();
+        sign->move(right, (height() - sign->height()) / 2);
+    }
+    QMargins margins = textMargins();
+    margins.setRight(qMax(margins.left(), width() - right));
+    setTextMargins(margins);
+}
+
+void ToolkitPasswordEdit::focusInEvent(QFocusEvent* event)
+{
+    ToolkitLineEdit::focusInEvent(event);
+    updateCapsLock();
+}
+
+void ToolkitPasswordEdit::focusOutEvent(QFocusEvent* event)
+{
+    ToolkitLineEdit::focusOutEvent(event);
+    updateCapsLock();
+}
+
+void ToolkitPasswordEdit::hideEvent(QHideEvent* event)
+{
+    ToolkitLineEdit::hideEvent(event);
+    m_echoButton->setChecked(false);
+}
+
+void ToolkitPasswordEdit::keyPressEvent(QKeyEvent* event)
+{
+    updateCapsLock();
+    // Cutting hidden text would delete it without putting it anywhere.
+    if (echoMode() != QLineEdit::Normal && event->matches(QKeySequence::Cut)) {
+        event->accept();
+        return;
+    }
+    ToolkitLineEdit::keyPressEvent(event);
+}
+
+void ToolkitPasswordEdit::keyReleaseEvent(QKeyEvent* event)
+{
+    updateCapsLock();
+    ToolkitLineEdit::keyReleaseEvent(event);
+}
+
+void ToolkitPasswordEdit::resizeEvent(QResizeEvent* event)
+{
+    ToolkitLineEdit::resizeEvent(event);
+    arrange();
+}

@@ -1,0 +1,39 @@
+#pragma once
+
+#include "toolkitlineedit.h"
+
+class QAbstractButton;
+
+/**
+ * A line edit for a password. A button inside it reveals the text until it is pressed again or the field disappears;
+ * text that is hidden cannot be copied, cut or dragged out. Under X11 a sign shows that Caps Lock is on while the
+ * field has the focus.
+ */
+class ToolkitPasswordEdit : public ToolkitLineEdit
+{
+    Q_OBJECT
+
+public:
+    explicit ToolkitPasswordEdit(QWidget* parent = nullptr);
+
+    /// Whether the field offers its reveal button, as it does at first. Without it the text is hidden.
+    void setEchoButtonVisible(bool visible);
+    bool isEchoButtonVisible() const { return m_echoButtonVisible; }
+
+protected:
+    void focusInEvent(QFocusEvent* event) override;
+    void focusOutEvent(QFocusEvent* event) override;
+    void hideEvent(QHideEvent* event) override;
+    void keyPressEvent(QKeyEvent* event) override;
+    void keyReleaseEvent(QKeyEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
+
+private:
+    void setRevealed(bool revealed);
+    void updateCapsLock();
+    void arrange();
+
+    QAbstractButton* m_echoButton;
+    QWidget* m_capsSign;
+    bool m_echoButtonVisible = true;
+};

@@ -1,0 +1,233 @@
+#include "noticedialog.h"
+
+#include "notification.h"
+#include "screens.h"
+#include "toolkitblurframe.h"
+#include "toolkitlabel.h"
+#include "toolkitsuggestbutton.h"
+#include "windowmanagerhelper.h"
+
+#include <QBoxLayout>
+#include <QCloseEvent>
+#include <QDebug>
+#include <QPainter>
+#include <QPlainTextEdit>
+#include <QPointer>
+
+namespace
+{
+
+constexpr QSize kDialogSize(428, 450);
+constexpr int kFrameWidth = 400;
+constexpr int kTitleHeight = 60;
+constexpr int kContentHeight = 255;
+constexpr QSize kLineSize(388, 1);
+constexpr QSize kButtonSize(178, 38);
+constexpr QSize kWideButtonSize(390, 38);
+constexpr int kRefreshDelayMs = 1000;
+constexpr int kOpaque = 255;
+
+QString closeText()
+{
+    return QStringLiteral("关闭");
+}
+
+/// A text to read: literal, scrolled by wheel and keys without a scroll bar, and left by Tab.
+class TextView : public QPlainTextEdit
+{
+public:
+    explicit TextView(QWidget* parent) : QPlainTextEdit(parent)
+    {
+        setObjectName(QStringLiteral("plainTextEdit"));
+        setReadOnly(true);
+        setTabChangesFocus(true);
+        setVerticalScrollBarPolicy(Qt::ScrollBarAlwaysOff);
+        setHorizontalScrollBarPolicy(Qt::ScrollBarAlwaysOff);
+        setWordWrapMode(QTextOption::WrapAtWordBoundaryOrAnywhere);
+        setFrameShape(QFrame::NoFrame);
+        viewport()->setAutoFillBackground(false);
+    }
+
+protected:
+    void paintEvent(QPaintEvent* event) override
+    {
+        QPlainTextEdit::paintEvent(event);
+        if (!hasFocus() || !window()->testAttribute(Qt::WA_KeyboardFocusChange))
+            return;
+        QPainter painter(viewport());
+        painter.setRenderHint(QPainter::Antialiasing);
+        painter.setPen(QPen(palette().color(QPalette::Highlight), 1));
+        painter.drawRoundedRect(QRectF(viewport()->rect()).adjusted(0.5, 0.5, -0.5, -0.5), 4, 4);
+    }
+};
+
+} // namespace
+
+NoticeDialog::NoticeDialog(const QString& userName, QWidget* parent) : ToolkitDialog(parent), m_userName(userName)
+{
+    createInterface();
+}
+
+QPushButton* NoticeDialog::firstButton() const
+{
+    return m_firstButton;
+}
+
+QPushButton* NoticeDialog::nextButton() const
+{
+    return m_nextButton;
+}
+
+void NoticeDialog::createInterface()
+{
+    setSurface(ThemeHelper::LightType);
+    setIcon(QIcon(QStringLiteral(":/images/infologo.svg")));
+    setFixedSize(kDialogSize);
+    zent::screens::placeCentre(*this);
+
+    m_contentFrame = new ToolkitBlurFrame(this);
+    m_contentFrame->setObjectName(QStringLiteral("informationWidget"));
+    m_contentFrame->setFixedWidth(kFrameWidth);
+    if (!WindowManagerHelper::instance()->hasBlurWindow())
+        m_contentFrame->setMaskAlpha(kOpaque);
+
+    m_titleView = createTextView(kTitleHeight, QFont::Medium, QStringLiteral("消息标题"));
+    m_senderLabel = createDetailLabel();
+    m_timeLabel = createDetailLabel();
+    auto* details = new QHBoxLayout;
+    details->addWidget(m_senderLabel, 1, Qt::AlignLeft);
+    details->addWidget(m_timeLabel, 0, Qt::AlignRight);
+    auto* line = new QFrame(m_contentFrame);
+    line->setObjectName(QStringLiteral("line"));
+    line->setFrameShape(QFrame::HLine);
+    line->setFrameShadow(QFrame::Plain);
+    line->setFixedSize(kLineSize);
+    QPalette lineColors = line->palette();
+    lineColors.setColor(QPalette::WindowText, QColor(0, 0, 0, 40));
+    line->setPalette(lineColors);
+    m_contentView = createTextView(kContentHeight, QFont::Normal, QStringLiteral("消息内容"));
+
+    auto* layout = new QVBoxLayout(m_contentFrame);
+    layout->setObjectName(QStringLiteral("mainLayout"));
+    layout->setSpacing(3);
+    layout->setContentsMargins(5, 5, 5, 5);
+    layout->addWidget(m_titleView);
+    layout->addLayout(details);
+    layout->addWidget(line, 0, Qt::AlignHCenter);
+    layout->addWidget(m_contentView);
+    layout->addLayout(createButtons());
+    addContent(m_contentFrame, Qt::AlignHCenter);
+}
+
+QPlainTextEdit* NoticeDialog::createTextView(int height, int weight, const QString& accessibleName)
+{
+    auto* view = new TextView(m_contentFrame);
+    view->setAccessibleName(accessibleName);
+    view->setFixedHeight(height);
+    QFont font = view->font();
+    font.setPixelSize(14);
+    font.setWeight(weight);
+    view->setFont(font);
+    return view;
+}
+
+QLabel* NoticeDialog::createDetailLabel()
+{
+    auto* label = new ToolkitLabel(m_contentFrame);
+    QFont font = label->font();
+    font.setPixelSize(12);
+    label->setFont(font);
+    QColor color(Qt::black);
+    color.setAlphaF(0.7);
+    QPalette colors = label->palette();
+    colors.setColor(QPalette::WindowText, color);
+    label->setPalette(colors);
+    return label;
+}
+
+QLayout* NoticeDialog::createButtons()
+{
+    m_firstButton = new ToolkitPushButton(closeText(), m_contentFrame);
+    m_firstButton->setObjectName(QStringLiteral("closeButton"));
+    m_nextButton = new ToolkitSuggestButton(QStringLiteral("下一条"), m_contentFrame);
+    m_nextButton->setObjectName(QStringLiteral("nextButton"));
+    auto* layout = new QHBoxLayout;
+    layout->setSpacing(0);
+    for (ToolkitPushButton* button : {m_firstButton, static_cast<ToolkitPushButton*>(m_nextButton)}) {
+        QPalette colors = button->palette();
+        colors.setColor(QPalette::ButtonText, Qt::white);
+        button->setPalette(colors);
+        button->setFixedSize(kButtonSize);
+    }
+    m_firstButton->setStyleSheet(QStringLiteral("color:black;"));
+    layout->addWidget(m_firstButton);
+    layout->addStretch();
+    layout->addWidget(m_nextButton);
+    return layout;
+}
+
+void NoticeDialog::showNotice()
+{
+    qDebug() << "showNotice";
+    const QPointer<NoticeDialog> self = this;
+    QNotification::msleep(kRefreshDelayMs);
+    // Events were let through: the dialog or the service may be gone.
+    if (!self || !QNotification::qInstance)
+        return;
+    QNotification::qInstance->getNotifyMessageList(m_userName, true, 1, 1,
+                                                   [self](bool ok, const NotifyMessageResponse& response) {
+                                                       if (self)
+                                                           self->onMessageList(ok, response);
+                                                   });
+}
+
+void NoticeDialog::onMessageList(bool ok, const NotifyMessageResponse& response)
+{
+    qDebug() << "noticeDialog::getNotifyMessageList()-01:" << (ok ? "true" : "false");
+    if (!ok)
+        return;
+    m_total = response.total;
+    qDebug() << "noticeDialog::getNotifyMessageList()-02:" << m_total;
+    if (response.messages.isEmpty()) {
+        m_firstButton->show();
+        m_nextButton->hide();
+        m_firstButton->setText(closeText());
+        return;
+    }
+    qDebug() << "noticeDialog::getNotifyMessageList()-03:";
+    showMessage(response.messages.constFirst());
+    updateButtons();
+    // The next button loses the focus while it is disabled, by default to the close button, where a second Return
+    // would close the dialog.
+    if (!isVisible() || !m_contentFrame->isAncestorOf(focusWidget()))
+        m_contentView->setFocus();
+    show();
+    m_nextButton->setEnabled(true);
+}
+
+void NoticeDialog::showMessage(const NotifyMessage& message)
+{
+    setTitle(QStringLiteral("消息详情"));
+    m_titleView->setPlainText(message.title);
+    m_senderLabel->setText(QStringLiteral("发送人: ") + message.send_uid);
+    m_timeLabel->setText(QNotification::formatTime(message.created_at, true));
+    m_contentView->setPlainText(message.content);
+    m_currentUuid = message.uuid;
+}
+
+void NoticeDialog::updateButtons()
+{
+    const bool last = m_total < 2;
+    m_firstButton->setFixedSize(last ? kWideButtonSize : kButtonSize);
+    m_firstButton->setText(last ? QStringLiteral("已读") : closeText());
+    m_firstButton->show();
+    m_nextButton->setVisible(!last);
+    if (!last)
+        m_nextButton->setText(QStringLiteral("下一条(%1)").arg(QNotification::formatUnReadNumber(m_total)));
+}
+
+void NoticeDialog::closeEvent(QCloseEvent* event)
+{
+    event->ignore();
+    hide();
+}

@@ -1,0 +1,173 @@
+#include "desktopnotifier.h"
+
+#include "notificationnames.h"
+
+#include <QDBusConnection>
+#include <QDBusError>
+#include <QDBusMessage>
+#include <QDBusPendingCallWatcher>
+#include <QDBusPendingReply>
+#include <QDBusServiceWatcher>
+#include <QDebug>
+#include <QVariantMap>
+
+#include <utility>
+
+namespace
+{
+
+using zent::dbus::kDesktopNotificationsPath;
+using zent::dbus::kDesktopNotificationsService;
+
+constexpr int kCallTimeoutMs = 5000;
+constexpr int kServerDecidesExpiry = -1;
+constexpr uint kReplacesNone = 0;
+const QString kApplicationName = QStringLiteral("域管平台");
+const QString kActionLabel = QStringLiteral("查看");
+const QString kSenderLabel = QStringLiteral("发送人: ");
+/// Name of the program's icon in the icon theme and of its desktop entry.
+const QString kIconName = QStringLiteral("zentw-info");
+/// The action of a click on the notification itself, by the desktop's convention.
+const QString kDefaultAction = QStringLiteral("default");
+
+QDBusMessage methodCall(const QString& method)
+{
+    return QDBusMessage::createMethodCall(kDesktopNotificationsService, kDesktopNotificationsPath,
+                                          kDesktopNotificationsService, method);
+}
+
+} // namespace
+
+DesktopNotifier::DesktopNotifier(QObject* parent) : QObject(parent)
+{
+    QDBusConnection bus = QDBusConnection::sessionBus();
+    if (!bus.isConnected())
+        return;
+    bus.connect(kDesktopNotificationsService, kDesktopNotificationsPath, kDesktopNotificationsService,
+                QStringLiteral("ActionInvoked"), this, SLOT(onActionInvoked(uint, QString)));
+    bus.connect(kDesktopNotificationsService, kDesktopNotificationsPath, kDesktopNotificationsService,
+                QStringLiteral("NotificationClosed"), this, SLOT(onNotificationClosed(uint, uint)));
+    auto* watcher =
+        new QDBusServiceWatcher(kDesktopNotificationsService, bus, QDBusServiceWatcher::WatchForOwnerChange, this);
+    connect(watcher, &QDBusServiceWatcher::serviceOwnerChanged, this,
+            [this](const QString&, const QString& oldOwner) { onServerChanged(oldOwner); });
+}
+
+QString DesktopNotifier::body(const QString& sender, const QString& text)
+{
+    return sender.isEmpty() ? text : kSenderLabel + sender + QLatin1Char('\n') + text;
+}
+
+template <typename Function>
+QDBusPendingCallWatcher* DesktopNotifier::call(const QDBusMessage& question, Function finished)
+{
+    const QDBusPendingCall pending = QDBusConnection::sessionBus().asyncCall(question, kCallTimeoutMs);
+    auto* watcher = new QDBusPendingCallWatcher(pending, this);
+    connect(watcher, &QDBusPendingCallWatcher::finished, this, [watcher, finished] {
+        watcher->deleteLater();
+        finished(*watcher);
+    });
+    return watcher;
+}
+
+void DesktopNotifier::notify(const QString& title, const QString& sender, const QString& text)
+{
+    const Message message{title, sender, text};
+    if (!QDBusConnection::sessionBus().isConnected()) {
+        // A call on a bus that is not there would never finish.
+        QMetaObject::invokeMethod(
+            this, [this, message] { giveUp(message); }, Qt::QueuedConnection);
+        return;
+    }
+    if (m_capabilities == Capabilities::Known) {
+        send(message);
+        return;
+    }
+    m_waiting.append(message);
+    if (m_capabilities == Capabilities::Unknown)
+        askCapabilities();
+}
+
+void DesktopNotifier::onServerChanged(const QString& oldOwner)
+{
+    // A service that appears may be the one that our question has started.
+    if (oldOwner.isEmpty())
+        return;
+    ++m_server;
+    m_ids.clear();
+    const bool wasAsked = m_capabilities == Capabilities::Asked;
+    m_capabilities = Capabilities::Unknown;
+    if (wasAsked) {
+        delete m_capabilitiesCall;
+        askCapabilities();
+    }
+}
+
+void DesktopNotifier::askCapabilities()
+{
+    m_capabilities = Capabilities::Asked;
+    m_capabilitiesCall = call(methodCall(QStringLiteral("GetCapabilities")),
+                              [this](const QDBusPendingCall& answer) { onCapabilities(answer); });
+}
+
+void DesktopNotifier::onCapabilities(const QDBusPendingCall& call)
+{
+    const QDBusPendingReply<QStringList> reply = call;
+    m_capabilitiesCall = nullptr;
+    m_capabilities = reply.isValid() ? Capabilities::Known : Capabilities::Unknown;
+    m_bodyMarkup = reply.isValid() && reply.value().contains(QStringLiteral("body-markup"));
+    if (reply.isError())
+        qWarning() << "DesktopNotifier"
+                   << "GetCapabilities" << reply.error().name() << reply.error().message();
+    const QVector<Message> waiting = std::exchange(m_waiting, {});
+    for (const Message& message : waiting) {
+        if (reply.isValid())
+            send(message);
+        else
+            giveUp(message);
+    }
+}
+
+void DesktopNotifier::send(const Message& message)
+{
+    const QString plainBody = body(message.sender, message.text);
+    QDBusMessage question = methodCall(QStringLiteral("Notify"));
+    // The title is never escaped: services take it as plain text even where the body is markup.
+    question << kApplicationName << kReplacesNone << kIconName << message.title
+             << (m_bodyMarkup ? plainBody.toHtmlEscaped() : plainBody) << QStringList{kDefaultAction, kActionLabel}
+             << QVariantMap{{QStringLiteral("desktop-entry"), kIconName}} << kServerDecidesExpiry;
+    call(question, [this, message, server = m_server](const QDBusPendingCall& answer) {
+        if (server == m_server)
+            onSent(answer, message);
+        else if (answer.isError())
+            giveUp(message);
+    });
+}
+
+void DesktopNotifier::onSent(const QDBusPendingCall& call, const Message& message)
+{
+    const QDBusPendingReply<uint> reply = call;
+    if (reply.isValid()) {
+        m_ids.insert(reply.value());
+        return;
+    }
+    qWarning() << "DesktopNotifier"
+               << "Notify" << reply.error().name() << reply.error().message();
+    giveUp(message);
+}
+
+void DesktopNotifier::giveUp(const Message& message)
+{
+    emit unavailable(message.title, message.sender, message.text);
+}
+
+void DesktopNotifier::onActionInvoked(uint id, const QString& action)
+{
+    if (action == kDefaultAction && m_ids.contains(id))
+        emit activated();
+}
+
+void DesktopNotifier::onNotificationClosed(uint id, uint)
+{
+    m_ids.remove(id);
+}

@@ -1,0 +1,295 @@
+#include "desktopnotifier.h"
+#include "logcapture.h"
+
+#include <QDBusConnection>
+#include <QDBusContext>
+#include <QDBusMessage>
+#include <QDBusServiceWatcher>
+#include <QElapsedTimer>
+#include <QtTest>
+
+#include <memory>
+
+namespace
+{
+
+const QString kService = QStringLiteral("org.freedesktop.Notifications");
+const QString kPath = QStringLiteral("/org/freedesktop/Notifications");
+const QString kSender = QStringLiteral("管理员");
+
+/// A notification service of the desktop, on a connection of its own.
+class FakeServer : public QObject, protected QDBusContext
+{
+    Q_OBJECT
+    Q_CLASSINFO("D-Bus Interface", "org.freedesktop.Notifications")
+
+public:
+    explicit FakeServer(const QStringList& capabilities) : capabilities(capabilities)
+    {
+        static int number = 0;
+        m_name = QString("server%1").arg(++number);
+        QDBusConnection bus = QDBusConnection::connectToBus(QDBusConnection::SessionBus, m_name);
+        if (!bus.registerObject(kPath, this, QDBusConnection::ExportAllSlots | QDBusConnection::ExportAllSignals) ||
+            !bus.registerService(kService))
+            qFatal("cannot own %s", qPrintable(kService));
+    }
+    /// Leaves the bus, as a program that ends.
+    ~FakeServer() override { QDBusConnection::disconnectFromBus(m_name); }
+
+    QStringList capabilities;
+    /// The method that fails, or that never answers.
+    QString failing;
+    QString hanging;
+    int asked = 0;
+    QList<QVariantList> shown;
+    uint lastId = 100;
+
+public slots:
+    QStringList GetCapabilities()
+    {
+        ++asked;
+        answer("GetCapabilities");
+        return capabilities;
+    }
+    uint Notify(const QString& application, uint replaces, const QString& icon, const QString& summary,
+                const QString& body, const QStringList& actions, const QVariantMap& hints, int timeout)
+    {
+        shown.append({application, replaces, icon, summary, body, actions, hints, timeout});
+        answer("Notify");
+        return ++lastId;
+    }
+
+signals:
+    void ActionInvoked(uint id, const QString& action);
+    void NotificationClosed(uint id, uint reason);
+
+private:
+    void answer(const QString& method)
+    {
+        if (hanging == method)
+            setDelayedReply(true);
+        else if (failing == method)
+            sendErrorReply(QDBusError::Failed, "the server says no");
+    }
+
+    QString m_name;
+};
+
+} // namespace
+
+class TestDesktopNotifier : public QObject
+{
+    Q_OBJECT
+
+    std::unique_ptr<DesktopNotifier> m_notifier;
+    std::unique_ptr<FakeServer> m_server;
+    std::unique_ptr<QSignalSpy> m_activated;
+    std::unique_ptr<QSignalSpy> m_unavailable;
+
+    void startServer(const QStringList& capabilities = {"actions", "body", "body-markup"})
+    {
+        m_server.reset();
+        m_server = std::make_unique<FakeServer>(capabilities);
+    }
+
+    /// Lets everything arrive that was under way before: the bus keeps the order of a connection's messages.
+    void settle()
+    {
+        const QString name = QString("com.vantor.test.settle%1").arg(++m_round);
+        QDBusServiceWatcher watcher(name, QDBusConnection::sessionBus(), QDBusServiceWatcher::WatchForRegistration);
+        QSignalSpy seen(&watcher, &QDBusServiceWatcher::serviceRegistered);
+        QDBusConnection other = QDBusConnection::connectToBus(QDBusConnection::SessionBus, name);
+        if (!other.registerService(name) || !(seen.size() || seen.wait()))
+            qFatal("the bus does not answer");
+        QDBusConnection::disconnectFromBus(name);
+    }
+    int m_round = 0;
+
+    /// Shows one message and waits until the notifier knows its id.
+    void showOne()
+    {
+        const int before = m_server->shown.size();
+        m_notifier->notify("title", kSender, "text");
+        QTRY_COMPARE(m_server->shown.size(), before + 1);
+        settle();
+    }
+
+private slots:
+    void initTestCase() { QVERIFY2(qEnvironmentVariableIsSet("ROOM"), "runs inside a room only"); }
+
+    void init()
+    {
+        m_notifier = std::make_unique<DesktopNotifier>();
+        m_activated = std::make_unique<QSignalSpy>(m_notifier.get(), &DesktopNotifier::activated);
+        m_unavailable = std::make_unique<QSignalSpy>(m_notifier.get(), &DesktopNotifier::unavailable);
+    }
+
+    void cleanup()
+    {
+        m_server.reset();
+        m_notifier.reset();
+    }
+
+    void showsTheMessage_data()
+    {
+        QTest::addColumn<QStringList>("capabilities");
+        QTest::addColumn<QString>("sender");
+        QTest::addColumn<QString>("body");
+        const QStringList markup{"body", "body-markup", "actions"};
+        QTest::newRow("markup") << markup << QStringLiteral("<a>管理员")
+                                << QStringLiteral("发送人: &lt;a&gt;管理员\n&lt;b&gt; &amp;amp; &quot;x&quot;\n2");
+        QTest::newRow("plain") << QStringList{"body", "actions"} << QStringLiteral("<a>管理员")
+                               << QStringLiteral("发送人: <a>管理员\n<b> &amp; \"x\"\n2");
+        QTest::newRow("no sender") << markup << "" << QStringLiteral("&lt;b&gt; &amp;amp; &quot;x&quot;\n2");
+        QTest::newRow("no capabilities") << QStringList() << "s" << QStringLiteral("发送人: s\n<b> &amp; \"x\"\n2");
+    }
+    void showsTheMessage()
+    {
+        QFETCH(QStringList, capabilities);
+        QFETCH(QString, sender);
+        QFETCH(QString, body);
+        startServer(capabilities);
+        m_notifier->notify(QStringLiteral("<i>标题 & more"), sender, "<b> &amp; \"x\"\n2");
+        QTRY_COMPARE(m_server->shown.size(), 1);
+        const QVariantList arguments{
+            QStringLiteral("域管平台"),
+            0U,
+            "zentw-info",
+            QStringLiteral("<i>标题 & more"),
+            body,
+            QStringList{"default", QStringLiteral("查看")},
+            QVariantMap{{"desktop-entry", "zentw-info"}},
+            -1,
+        };
+        QCOMPARE(m_server->shown.first(), arguments);
+        settle();
+        QCOMPARE(m_unavailable->size(), 0);
+    }
+
+    void asksCapabilitiesOnceAndKeepsTheOrder()
+    {
+        startServer();
+        for (const char* title : {"1", "2", "3"})
+            m_notifier->notify(title, "", "");
+        QTRY_COMPARE(m_server->shown.size(), 3);
+        showOne();
+        QStringList titles;
+        for (const QVariantList& arguments : m_server->shown)
+            titles.append(arguments.at(3).toString());
+        QCOMPARE(titles, QStringList({"1", "2", "3", "title"}));
+        QCOMPARE(m_server->asked, 1);
+    }
+
+    void onlyClicksOnOurOwnActivate()
+    {
+        startServer();
+        showOne();
+        const uint ours = m_server->lastId;
+        emit m_server->ActionInvoked(ours + 1, "default");
+        emit m_server->ActionInvoked(ours, "other");
+        settle();
+        QCOMPARE(m_activated->size(), 0);
+        emit m_server->ActionInvoked(ours, "default");
+        QTRY_COMPARE(m_activated->size(), 1);
+        emit m_server->NotificationClosed(ours, 2);
+        emit m_server->ActionInvoked(ours, "default");
+        settle();
+        QCOMPARE(m_activated->size(), 1);
+    }
+
+    void anotherProgramCannotActivate()
+    {
+        startServer();
+        showOne();
+        QDBusMessage forged = QDBusMessage::createSignal(kPath, kService, "ActionInvoked");
+        forged << m_server->lastId << "default";
+        QDBusConnection stranger = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "stranger");
+        QVERIFY(stranger.send(forged));
+        settle();
+        QDBusConnection::disconnectFromBus("stranger");
+        QCOMPARE(m_activated->size(), 0);
+    }
+
+    void failureIsReported_data()
+    {
+        QTest::addColumn<QString>("failing");
+        QTest::addColumn<QString>("hanging");
+        QTest::addColumn<int>("delayMs");
+        QTest::newRow("no service") << ""
+                                    << "" << 0;
+        QTest::newRow("capabilities fail") << "GetCapabilities"
+                                           << "" << 0;
+        QTest::newRow("notify fails") << "Notify"
+                                      << "" << 0;
+        QTest::newRow("capabilities hang") << ""
+                                           << "GetCapabilities" << 5000;
+        QTest::newRow("notify hangs") << ""
+                                      << "Notify" << 5000;
+    }
+    void failureIsReported()
+    {
+        QFETCH(QString, failing);
+        QFETCH(QString, hanging);
+        QFETCH(int, delayMs);
+        if (!failing.isEmpty() || !hanging.isEmpty()) {
+            startServer();
+            m_server->failing = failing;
+            m_server->hanging = hanging;
+        }
+        LogCapture log;
+        QElapsedTimer clock;
+        clock.start();
+        m_notifier->notify("<t>", kSender, "<x>");
+        QVERIFY2(clock.elapsed() < 100, "must not wait for the service");
+        QCOMPARE(m_unavailable->size(), 0);
+        QVERIFY(m_unavailable->wait(delayMs + 2000));
+        QVERIFY2(clock.elapsed() >= delayMs - 100, qPrintable(QString::number(clock.elapsed())));
+        QCOMPARE(m_unavailable->first(), QVariantList({"<t>", kSender, "<x>"}));
+        QCOMPARE(log.count("DesktopNotifier"), 1);
+
+        // The next message is tried afresh.
+        if (!m_server)
+            startServer();
+        m_server->failing = m_server->hanging = QString();
+        showOne();
+        QCOMPARE(m_unavailable->size(), 1);
+    }
+
+    void restartedServerIsAskedAgain()
+    {
+        startServer();
+        showOne();
+        const uint former = m_server->lastId;
+        QCOMPARE(m_server->shown.last().at(4).toString(), DesktopNotifier::body(kSender, "text"));
+        startServer({"body"});
+        settle();
+        // Numbers begin anew, so the former service's mean nothing now.
+        emit m_server->ActionInvoked(former, "default");
+        settle();
+        QCOMPARE(m_activated->size(), 0);
+        m_notifier->notify("t", "", "<x>");
+        QTRY_COMPARE(m_server->shown.size(), 1);
+        QCOMPARE(m_server->asked, 1);
+        QCOMPARE(m_server->shown.first().at(4).toString(), QString("<x>"));
+        settle();
+        emit m_server->ActionInvoked(m_server->lastId, "default");
+        QTRY_COMPARE(m_activated->size(), 1);
+        QCOMPARE(m_unavailable->size(), 0);
+    }
+
+    void restartWhileAsked()
+    {
+        startServer();
+        m_server->hanging = "GetCapabilities";
+        m_notifier->notify("t", "", "x");
+        QTRY_COMPARE(m_server->asked, 1);
+        QElapsedTimer clock;
+        clock.start();
+        startServer({"body"});
+        QTRY_VERIFY(m_server->shown.size() + m_unavailable->size() == 1);
+        QVERIFY2(clock.elapsed() < 2000, "the end of the service must be noticed");
+    }
+};
+
+QTEST_GUILESS_MAIN(TestDesktopNotifier)
+#include "test_desktopnotifier.moc"
