@@ -8,45 +8,153 @@ display given by the environment, and stays until that window is closed.
 
 import argparse
 import os
+import subprocess
 import sys
 
 import roomclient
 from desktop import Desktop, stop
 
-# Where the page buttons lie in the panel.
+# Where things lie in the panel, from its top left, and the links from its bottom left.
 LOGIN_BUTTON = (85, 145)
 NETWORK_BUTTON = (215, 145)
+RELEASE_LINK = (190, -32)
+PASSWORD_LINK = (262, -32)
 BACKGROUND = "#3d5a80"
+NOTICE_SIZE = (428, 450)
+RELEASE_SIZE = (400, 200)
+SPINNER_SIZE = (380, 160)
+PASSWORD_SIZE = (400, 280)
+INTEGRITY_SIZE = (380, 160)
+SERVICE = "com.vantor.tarn"
 
 
-def take_pictures(desktop, directory):
-    """Opens the panel from the tray and takes a picture of each page."""
-    # The first left click after the start only hides the hidden panel; a right click before it makes it show.
-    desktop.click_icon(button=3)
-    desktop.click_icon()
-    desktop.wait("the panel", desktop.panel)
-    roomclient.wait_record(lambda entry: entry.get("path") == "/api/client/area/scenes", 15)
-    desktop.wait("the scene box", lambda: desktop.geometry(desktop.panel())[3] > 520)
-    for name, button in (("login", LOGIN_BUTTON), ("network", NETWORK_BUTTON)):
-        asked = len(roomclient.record("dbus", method="GetActiveConnectionInfo"))
-        desktop.click_panel(*button)
-        desktop.wait("the page", lambda: len(roomclient.record("dbus", method="GetActiveConnectionInfo")) > asked)
-        desktop.run("xdotool", "mousemove", "400", "300")
-        settle(desktop)
-        desktop.screenshot(os.path.join(directory, f"panel-{name}.png"), desktop.panel())
-        desktop.screenshot(os.path.join(directory, f"desktop-{name}.png"))
+class Demo:
+    """The scenes of the demo; each leaves its pictures and puts the desktop back."""
 
+    def __init__(self, desktop, directory):
+        self.desktop = desktop
+        self.directory = directory
 
-def settle(desktop):
-    """Waits until two pictures in a row are the same, so that none is taken in the middle of painting."""
-    last = [None]
+    def picture(self, name, window="root"):
+        """A picture of a window, or of the whole screen, once it has stopped changing."""
+        last = [None]
 
-    def unchanged():
-        picture = desktop.run("sh", "-c", "import -window root rgb:- | sha256sum")
-        same, last[0] = picture == last[0], picture
-        return same
+        def unchanged():
+            content = self.desktop.run("sh", "-c", f"import -window {window} rgb:- | sha256sum")
+            same, last[0] = content == last[0], content
+            return same
 
-    desktop.wait("a steady picture", unchanged)
+        self.desktop.wait("a steady picture", unchanged)
+        self.desktop.screenshot(os.path.join(self.directory, name + ".png"), window)
+
+    def dialog(self, size):
+        """Waits for the client's window of this size."""
+        return self.desktop.wait(f"the {size} window", lambda: next(
+            (window for window, (_, _, *wh) in self.desktop.windows() if tuple(wh) == size), None))
+
+    def gone(self, window):
+        self.desktop.wait("the window to close", lambda: not self.desktop.geometry(window))
+
+    def keys(self, window, *keys):
+        self.desktop.run("xdotool", "windowfocus", "--sync", window, "key", *keys)
+
+    def type(self, window, text):
+        self.desktop.run("xdotool", "windowfocus", "--sync", window, "type", text)
+
+    def click_in(self, window, x, y):
+        """Clicks at a point of a window; negative coordinates count from its right and bottom."""
+        left, top, width, height = self.desktop.geometry(window)
+        self.desktop.click(left + (x if x >= 0 else width + x), top + (y if y >= 0 else height + y))
+
+    def call(self, path, interface, method, *arguments):
+        subprocess.run(["gdbus", "call", "--session", "-d", SERVICE, "-o", path, "-m", f"{interface}.{method}",
+                        *arguments], check=True, capture_output=True)
+
+    def panel(self):
+        """The panel's two pages."""
+        # The first left click after the start only hides the hidden panel; a right click before it makes it show.
+        self.desktop.click_icon(button=3)
+        self.desktop.click_icon()
+        panel = self.desktop.wait("the panel", self.desktop.panel)
+        self.desktop.wait("the scene box", lambda: self.desktop.geometry(panel)[3] > 520)
+        for name, button in (("login", LOGIN_BUTTON), ("network", NETWORK_BUTTON)):
+            asked = len(roomclient.record("dbus", method="GetActiveConnectionInfo"))
+            self.click_in(panel, *button)
+            self.desktop.wait("the page", lambda: len(roomclient.record("dbus", method="GetActiveConnectionInfo")) > asked)
+            self.desktop.run("xdotool", "mousemove", "400", "300")
+            self.picture(f"panel-{name}", panel)
+            self.picture(f"desktop-{name}")
+
+    def messages(self):
+        """An unread message is pushed, opened, stepped through and marked read."""
+        roomclient.patch_state({"messages": [
+            {"uuid": "1", "uid": "zhangsan", "send_uid": "信息中心", "title": "关于终端安全检查的通知",
+             "content": "各位同事：\n\n本周五将对全部终端进行安全检查，请提前保存文件。", "read_at": "",
+             "created_at": "2026-11-20T02:05:00Z"},
+            {"uuid": "2", "uid": "zhangsan", "send_uid": "管理员", "title": "密码将于 7 天后到期",
+             "content": "请在面板中点击“修改密码”完成修改。", "read_at": "", "created_at": "2026-11-24T08:30:00Z"}]})
+        self.desktop.run("dunstctl", "close-all")
+        self.call("/com/vantor/tarn/Notification", "com.vantor.tarn.Notification", "Notify",
+                  "1", "zhangsan", "密码将于 7 天后到期", "请在面板中点击“修改密码”完成修改。", "管理员")
+        self.desktop.wait("the notification", lambda: "1" in self.desktop.run("dunstctl", "count", "displayed"))
+        self.picture("message-pushed")
+        self.desktop.run("dunstctl", "action")
+        notice = self.dialog(NOTICE_SIZE)
+        self.desktop.run("dunstctl", "close-all")
+        self.picture("message-several", notice)
+        for name, button in (("message-last", (-100, -30)), ("message-none", (214, -30))):
+            listed = len(roomclient.record("http", path="/notification/v2/list"))
+            self.click_in(notice, *button)
+            self.desktop.wait("the refresh", lambda: len(roomclient.record("http", path="/notification/v2/list")) > listed)
+            self.picture(name, notice)
+        self.keys(notice, "Escape")
+        self.gone(notice)
+
+    def password(self):
+        """A refused password change, then one that succeeds."""
+        self.click_in(self.desktop.panel(), *PASSWORD_LINK)
+        dialog = self.dialog(PASSWORD_SIZE)
+        for old, name in (("wrong", "password-alert"), ("Zent@2026", None)):
+            self.keys(dialog, "ctrl+a")
+            self.type(dialog, old + "\tNew@2026x\tNew@2026x")
+            asked = len(roomclient.record("dbus", method="ModifyUserPassword"))
+            self.keys(dialog, "Return")
+            self.desktop.wait("the change", lambda: len(roomclient.record("dbus", method="ModifyUserPassword")) > asked)
+            if name:
+                self.picture(name)
+                self.keys(dialog, "shift+Tab", "shift+Tab")
+        self.gone(dialog)
+        self.picture("password-changed")
+
+    def integrity(self):
+        """A failed device-integrity verification."""
+        self.call("/com/vantor/tarn/Fullzone", "com.vantor.tarn.Fullzone", "Notify", "关键文件被修改：/usr/bin/login",
+                  "/fix/page")
+        dialog = self.dialog(INTEGRITY_SIZE)
+        self.picture("integrity-failed", dialog)
+        self.keys(dialog, "Escape")
+        self.gone(dialog)
+
+    def release(self):
+        """A refused administrator password, then the release up to the reboot prompt."""
+        self.click_in(self.desktop.panel(), *RELEASE_LINK)
+        dialog = self.dialog(RELEASE_SIZE)
+        self.type(dialog, "wrong")
+        self.picture("release-password", dialog)
+        before = {window for window, _ in self.desktop.windows()}
+        self.keys(dialog, "Return")
+        box = self.desktop.wait("the message", lambda: next(
+            (window for window, _ in self.desktop.windows() if window not in before), None))
+        self.picture("release-refused")
+        self.keys(box, "Escape")
+        self.gone(box)
+        self.type(dialog, "Admin@2026")
+        self.keys(dialog, "Return")
+        spinner = self.dialog(SPINNER_SIZE)
+        self.desktop.screenshot(os.path.join(self.directory, "release-running.png"), spinner)
+        roomclient.wait_record(lambda entry: entry.get("path") == "/uim/v3/client/remove")
+        roomclient.wait_for(lambda: len(roomclient.record("process", name="fenx-cli.bash")) > 0)
+        self.picture("release-reboot", spinner)
 
 
 def main():
@@ -60,9 +168,12 @@ def main():
         desktop.set_background(BACKGROUND)
         desktop.start_window_manager()
         desktop.start_tray()
+        desktop.start_notifications()
         client = desktop.start_client(options.client)
         desktop.wait("the tray icon", desktop.icon)
-        take_pictures(desktop, options.pictures)
+        demo = Demo(desktop, options.pictures)
+        for scene in (demo.panel, demo.messages, demo.integrity, demo.password, demo.release):
+            scene()
         if options.window:
             print("The desktop is yours: click the tray icon. Close the window to end the demo.", flush=True)
             desktop.x.wait()

@@ -83,6 +83,11 @@ class Desktop:
         self.wait("the tray", lambda: self.windows("tint2"))
         return process
 
+    def start_notifications(self):
+        """The desktop's notification service; dunstctl speaks to it."""
+        self.spawn(["dunst", "-conf", os.path.join(HERE, "dunstrc")])
+        self.wait("the notification service", lambda: self.run("dunstctl", "count"))
+
     def set_background(self, colour):
         self.run("xsetroot", "-solid", colour)
 

@@ -17,6 +17,7 @@ inline const QString kTrayWatcherPath = QStringLiteral("/StatusNotifierWatcher")
 /// The client's own name on the session bus, and what it exports there.
 inline const QString kClientService = QStringLiteral("com.vantor.tarn");
 inline const QString kNotificationPath = QStringLiteral("/com/vantor/tarn/Notification");
+inline const QString kFullzonePath = QStringLiteral("/com/vantor/tarn/Fullzone");
 
 /// The platform's identity service and its domain agent (system bus); their interfaces carry the services' names.
 inline const QString kIdentityService = QStringLiteral("com.vantor.zent.iam");

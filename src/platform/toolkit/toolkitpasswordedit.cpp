@@ -1,5 +1,7 @@
 #include "toolkitpasswordedit.h"
 
+#include "toolkittoolbutton.h"
+
 #include <QAbstractButton>
 #include <QKeyEvent>
 #include <QPainter>
@@ -95,8 +97,17 @@ protected:
 } // namespace
 
 ToolkitPasswordEdit::ToolkitPasswordEdit(QWidget* parent)
-    : ToolkitLineEdit(parent), m_echoButton(new EyeButton(this)), m_capsSign(new CapsLockSign(this))
+    : ToolkitLineEdit(parent), m_echoButton(new EyeButton(this)), m_capsSign(new CapsLockSign(this)),
+      m_clearButton(new ToolkitToolButton(this))
 {
+    m_clearButton->setObjectName(QStringLiteral("clearButton"));
+    m_clearButton->setAccessibleName(QStringLiteral("清空"));
+    m_clearButton->setFocusPolicy(Qt::NoFocus);
+    m_clearButton->setCursor(Qt::ArrowCursor);
+    m_clearButton->resize(signSize, signSize);
+    m_clearButton->hide();
+    connect(m_clearButton, &QAbstractButton::clicked, this, &QLineEdit::clear);
+    connect(this, &QLineEdit::textChanged, this, &ToolkitPasswordEdit::updateClearButton);
     setDragEnabled(false);
     connect(m_echoButton, &QAbstractButton::toggled, this, &ToolkitPasswordEdit::setRevealed);
     setRevealed(false);
@@ -124,6 +135,21 @@ void ToolkitPasswordEdit::setRevealed(bool revealed)
     m_echoButton->setToolTip(name);
 }
 
+void ToolkitPasswordEdit::setClearIcon(const QIcon& icon)
+{
+    m_clearButton->setIcon(icon);
+    updateClearButton();
+}
+
+void ToolkitPasswordEdit::updateClearButton()
+{
+    const bool shown = !m_clearButton->icon().isNull() && !text().isEmpty();
+    if (shown == m_clearButton->isVisibleTo(this))
+        return;
+    m_clearButton->setVisible(shown);
+    arrange();
+}
+
 void ToolkitPasswordEdit::updateCapsLock()
 {
     const bool shown = hasFocus() && capsLockOn();
@@ -136,7 +162,7 @@ void ToolkitPasswordEdit::updateCapsLock()
 void ToolkitPasswordEdit::arrange()
 {
     int right = width() - signInset;
-    for (QWidget* sign : {static_cast<QWidget*>(m_echoButton), m_capsSign}) {
+    for (QWidget* sign : {static_cast<QWidget*>(m_echoButton), static_cast<QWidget*>(m_clearButton), m_capsSign}) {
         if (!sign->isVisibleTo(this))
             continue;
         right -= sign->width();

@@ -2,6 +2,8 @@
 
 #include "toolkitlineedit.h"
 
+#include <QIcon>
+
 class QAbstractButton;
 
 /**
@@ -20,6 +22,9 @@ public:
     void setEchoButtonVisible(bool visible);
     bool isEchoButtonVisible() const { return m_echoButtonVisible; }
 
+    /// Shows a button with this icon while the field holds text; it empties the field. A null icon takes it away.
+    void setClearIcon(const QIcon& icon);
+
 protected:
     void focusInEvent(QFocusEvent* event) override;
     void focusOutEvent(QFocusEvent* event) override;
@@ -31,9 +36,11 @@ protected:
 private:
     void setRevealed(bool revealed);
     void updateCapsLock();
+    void updateClearButton();
     void arrange();
 
     QAbstractButton* m_echoButton;
     QWidget* m_capsSign;
+    QAbstractButton* m_clearButton;
     bool m_echoButtonVisible = true;
 };

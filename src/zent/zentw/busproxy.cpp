@@ -14,8 +14,8 @@ BusProxy::BusProxy(const QString& service, const QString& path, const QString& i
 
 QDBusError BusProxy::setRemoteProperty(const QString& name, const QVariant& value)
 {
-    QDBusMessage message = QDBusMessage::createMethodCall(service(), path(), zent::dbus::kPropertiesInterface,
-                                                          QStringLiteral("Set"));
+    QDBusMessage message =
+        QDBusMessage::createMethodCall(service(), path(), zent::dbus::kPropertiesInterface, QStringLiteral("Set"));
     message << interface() << name << QVariant::fromValue(QDBusVariant(value));
     return QDBusError(connection().call(message, QDBus::Block));
 }

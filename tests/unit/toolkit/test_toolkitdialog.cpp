@@ -60,7 +60,7 @@ private slots:
     void contentIsWhole();
     void messageIsLiteralAndWhole_data();
     void messageIsLiteralAndWhole();
-    void surfaceStaysAsPinned();
+    void surfaceFollowsTheThemeUnlessPinned();
     void alertMovesNothing();
     void alertMessageEnds();
     void hiddenPasswordStaysInside();
@@ -249,7 +249,7 @@ void TestToolkitDialog::messageIsLiteralAndWhole()
     QVERIFY(label->isHidden());
 }
 
-void TestToolkitDialog::surfaceStaysAsPinned()
+void TestToolkitDialog::surfaceFollowsTheThemeUnlessPinned()
 {
     ToolkitDialog dialog;
     QWidget* content = fixedContent(QSize(10, 10));
@@ -258,6 +258,16 @@ void TestToolkitDialog::surfaceStaysAsPinned()
     QVERIFY(content->palette().color(QPalette::Window).lightness() < 128);
     dialog.setSurface(ThemeHelper::LightType);
     QVERIFY(content->palette().color(QPalette::Window).lightness() > 128);
+
+    ToolkitDialog follower;
+    QWidget* inner = fixedContent(QSize(10, 10));
+    follower.addContent(inner);
+    for (const ThemeHelper::ColorType type : {ThemeHelper::DarkType, ThemeHelper::LightType}) {
+        QApplication::setPalette(ThemeHelper::palette(type));
+        QTRY_COMPARE(ThemeHelper::instance()->themeType(), type);
+        QCOMPARE(inner->palette().color(QPalette::Window), ThemeHelper::palette(type).color(QPalette::Window));
+        QVERIFY(content->palette().color(QPalette::Window).lightness() > 128);
+    }
 }
 
 void TestToolkitDialog::alertMovesNothing()

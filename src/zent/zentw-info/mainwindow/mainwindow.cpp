@@ -1,10 +1,12 @@
 #include "mainwindow.h"
 
+#include "closeguarddialog.h"
 #include "dbusnames.h"
 #include "httprequest.h"
 #include "infowidget.h"
 #include "legacyqt.h"
 #include "loginname.h"
+#include "modifydialog.h"
 #include "networkdaemonproxy.h"
 #include "noticedialog.h"
 #include "notification.h"
@@ -85,8 +87,10 @@ MainWindow::~MainWindow()
         delete member;
         member = nullptr;
     };
+    remove(modifyDialog);
     remove(noticeDialog);
     remove(messageWindow);
+    remove(guardDialog);
     remove(networkProxy);
     remove(userManager);
     remove(areaInfoTimer);
@@ -122,6 +126,8 @@ void MainWindow::createPanel()
 
 void MainWindow::connectPanel()
 {
+    connect(infoWidget, SIGNAL(modifyPasswordClicked()), this, SLOT(onModifypasswordClicked()));
+    connect(infoWidget, SIGNAL(removeRegionClicked()), this, SLOT(onCloseguardClicked()));
     connect(infoWidget, SIGNAL(shutdownClicked()), this, SLOT(onShutdownClicked()));
     connect(titlebar, &ToolkitTitlebar::windowDragged, this, [this] { movedByUser = true; });
     // Every change of page refreshes the page.

@@ -11,12 +11,14 @@
 #include <memory>
 
 class InfoWidget;
+class ModifyDialog;
 class NetworkDaemonProxy;
 class NoticeDialog;
 class QNetworkAccessManager;
 class QNetworkReply;
 class QTimer;
 class ToolkitTitlebar;
+class closeGuarddialog;
 
 namespace zent
 {
@@ -107,6 +109,10 @@ public slots:
     /// Ends the process at once, without clean-up.
     void loadSelf();
     void onOntopStatechanged();
+    /// Opens the administrator's release dialog.
+    void onCloseguardClicked();
+    /// Opens the password dialog.
+    void onModifypasswordClicked();
     void onLogininfoClicked();
     void onNetinfoClicked();
     void toLogininfo();
@@ -181,6 +187,7 @@ private:
     QList<QPair<QString, QString>> sceneList;
     bool openMessagetWindow = false;
     QString userName;
+    ModifyDialog* modifyDialog = nullptr;
     NoticeDialog* noticeDialog = nullptr;
     QWidget* messageWindow = nullptr;
     QTimer* userInfoTimer = nullptr;
@@ -188,6 +195,7 @@ private:
     std::unique_ptr<QTimer> unreadTimer;
     std::unique_ptr<QTimer> policyTimer;
     std::unique_ptr<QTimer> posTimer;
+    closeGuarddialog* guardDialog = nullptr;
     NetworkDaemonProxy* networkProxy = nullptr;
     QSystemTrayIcon* sysTrayIcon = nullptr;
     int infoPage = 0;

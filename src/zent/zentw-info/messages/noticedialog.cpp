@@ -154,7 +154,8 @@ QLayout* NoticeDialog::createButtons()
     auto* layout = new QHBoxLayout;
     layout->setSpacing(0);
     for (ToolkitPushButton* button : {m_firstButton, static_cast<ToolkitPushButton*>(m_nextButton)}) {
-        QPalette colors = button->palette();
+        // A whole palette: a widget with a style sheet takes what is not its own from the application's.
+        QPalette colors = ThemeHelper::palette(ThemeHelper::LightType);
         colors.setColor(QPalette::ButtonText, Qt::white);
         button->setPalette(colors);
         button->setFixedSize(kButtonSize);

@@ -97,10 +97,11 @@ void DesktopNotifier::onServerChanged(const QString& oldOwner)
     m_ids.clear();
     const bool wasAsked = m_capabilities == Capabilities::Asked;
     m_capabilities = Capabilities::Unknown;
-    if (wasAsked) {
-        delete m_capabilitiesCall;
-        askCapabilities();
-    }
+    if (!wasAsked)
+        return;
+    delete m_capabilitiesCall;
+    // Not asked again: the bus would start a service that dies of the question over and over.
+    giveUpWaiting();
 }
 
 void DesktopNotifier::askCapabilities()
@@ -113,19 +114,17 @@ void DesktopNotifier::askCapabilities()
 void DesktopNotifier::onCapabilities(const QDBusPendingCall& call)
 {
     const QDBusPendingReply<QStringList> reply = call;
-    m_capabilitiesCall = nullptr;
     m_capabilities = reply.isValid() ? Capabilities::Known : Capabilities::Unknown;
     m_bodyMarkup = reply.isValid() && reply.value().contains(QStringLiteral("body-markup"));
-    if (reply.isError())
+    if (reply.isError()) {
         qWarning() << "DesktopNotifier"
                    << "GetCapabilities" << reply.error().name() << reply.error().message();
-    const QVector<Message> waiting = std::exchange(m_waiting, {});
-    for (const Message& message : waiting) {
-        if (reply.isValid())
-            send(message);
-        else
-            giveUp(message);
+        giveUpWaiting();
+        return;
     }
+    const QVector<Message> waiting = std::exchange(m_waiting, {});
+    for (const Message& message : waiting)
+        send(message);
 }
 
 void DesktopNotifier::send(const Message& message)
@@ -154,6 +153,13 @@ void DesktopNotifier::onSent(const QDBusPendingCall& call, const Message& messag
     qWarning() << "DesktopNotifier"
                << "Notify" << reply.error().name() << reply.error().message();
     giveUp(message);
+}
+
+void DesktopNotifier::giveUpWaiting()
+{
+    const QVector<Message> waiting = std::exchange(m_waiting, {});
+    for (const Message& message : waiting)
+        giveUp(message);
 }
 
 void DesktopNotifier::giveUp(const Message& message)

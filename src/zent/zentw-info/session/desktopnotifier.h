@@ -51,12 +51,14 @@ private:
     void send(const Message& message);
     void onSent(const QDBusPendingCall& call, const Message& message);
     void giveUp(const Message& message);
+    void giveUpWaiting();
     /// Calls `finished` with the answer, or with an error after 5 s, always through the event loop.
     template <typename Function>
     QDBusPendingCallWatcher* call(const QDBusMessage& question, Function finished);
 
     Capabilities m_capabilities = Capabilities::Unknown;
     bool m_bodyMarkup = false;
+    /// Valid while the capabilities are asked for.
     QDBusPendingCallWatcher* m_capabilitiesCall = nullptr;
     /// Messages that wait for the capabilities.
     QVector<Message> m_waiting;

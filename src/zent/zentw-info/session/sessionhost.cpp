@@ -2,11 +2,13 @@
 
 #include "dbusnames.h"
 #include "desktopnotifier.h"
+#include "filecontent.h"
 #include "httprequest.h"
 #include "loginname.h"
 #include "mainwindow.h"
 #include "notify.h"
 #include "replies.h"
+#include "resumedialog.h"
 #include "trayhost.h"
 
 #include <QDBusConnection>
@@ -31,27 +33,46 @@ SessionHost::SessionHost(MainWindow& window, QObject* parent)
     showTrayIconWhenHosted();
     askScenesAfterOrganisation();
     showPushedMessages();
+    createIntegrityDialog();
     exportOnSessionBus();
 }
 
 SessionHost::~SessionHost()
 {
     QDBusConnection bus = QDBusConnection::sessionBus();
-    bus.unregisterObject(zent::dbus::kNotificationPath);
     bus.unregisterService(zent::dbus::kClientService);
+    bus.unregisterObject(zent::dbus::kNotificationPath);
+    bus.unregisterObject(zent::dbus::kFullzonePath);
+}
+
+void SessionHost::createIntegrityDialog()
+{
+    m_integrityDialog = std::make_unique<resumeDialog>();
+    QString host;
+    QString port;
+    zent::base::FileContent::instace()->getHostAndPort(host, port);
+    m_integrityDialog->setIpPort(host, port);
 }
 
 void SessionHost::exportOnSessionBus()
 {
-    QDBusConnection bus = QDBusConnection::sessionBus();
-    constexpr auto kOwnMembersOnly = QDBusConnection::ExportScriptableSlots | QDBusConnection::ExportScriptableSignals;
     // The objects first: whoever waits for the name finds them behind it.
-    if (!bus.registerObject(zent::dbus::kNotificationPath, m_notification, kOwnMembersOnly))
-        qWarning() << "SessionHost"
-                   << "cannot export" << zent::dbus::kNotificationPath << bus.lastError().message();
+    exportObject(zent::dbus::kNotificationPath, m_notification);
+    exportObject(zent::dbus::kFullzonePath, m_integrityDialog.get());
+    QDBusConnection bus = QDBusConnection::sessionBus();
     if (!bus.registerService(zent::dbus::kClientService))
         qWarning() << "SessionHost"
                    << "cannot own" << zent::dbus::kClientService << bus.lastError().message();
+}
+
+void SessionHost::exportObject(const QString& path, QObject* object)
+{
+    // Scriptable members only: a widget's own slots are nobody's business.
+    constexpr auto kOwnMembers = QDBusConnection::ExportScriptableSlots | QDBusConnection::ExportScriptableSignals;
+    QDBusConnection bus = QDBusConnection::sessionBus();
+    if (!bus.registerObject(path, object, kOwnMembers))
+        qWarning() << "SessionHost"
+                   << "cannot export" << path << bus.lastError().message();
 }
 
 void SessionHost::showPushedMessages()

@@ -4,9 +4,12 @@
 #include <QObject>
 #include <QString>
 
+#include <memory>
+
 class DesktopNotifier;
 class MainWindow;
 class Notification;
+class resumeDialog;
 
 /// What the desktop session wires to the main window beyond what the classes do among themselves: the client's objects
 /// on the session bus, desktop notifications for pushed messages, and the wait for a tray host. A bus that is missing
@@ -23,7 +26,9 @@ public:
 private:
     void showTrayIconWhenHosted();
     void askScenesAfterOrganisation();
+    void createIntegrityDialog();
     void exportOnSessionBus();
+    void exportObject(const QString& path, QObject* object);
     void showPushedMessages();
     void showAsBalloon(const QString& title, const QString& sender, const QString& text);
 
@@ -31,4 +36,5 @@ private:
     QMetaObject::Connection m_organisationConnection;
     Notification* m_notification;
     DesktopNotifier* m_notifier;
+    std::unique_ptr<resumeDialog> m_integrityDialog;
 };

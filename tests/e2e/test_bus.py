@@ -1,0 +1,98 @@
+"""What the client offers on the session bus, and how a pushed message reaches the user."""
+
+import re
+import subprocess
+import xml.etree.ElementTree as ElementTree
+
+from clienttest import ClientTest, roomclient, unittest
+
+SERVICE = "com.vantor.tarn"
+NOTIFICATION = "/com/vantor/tarn/Notification"
+NOTICE_SIZE = (428, 450)
+
+
+def gdbus(*arguments):
+    return subprocess.run(["gdbus", *arguments], capture_output=True, text=True, check=False)
+
+
+def push(user, title="标题 <b>%1</b>", text="正文 & <i>斜体</i>", sender="管理员"):
+    return gdbus("call", "--session", "-d", SERVICE, "-o", NOTIFICATION, "-m", "com.vantor.tarn.Notification.Notify",
+                 "1", user, title, text, sender)
+
+
+def unread(count):
+    messages = [{"uuid": f"u{i}", "uid": "zhangsan", "send_uid": "管理员", "title": f"通知 {i}", "content": "正文",
+                 "created_at": f"2026-11-24T08:0{i}:00Z", "read_at": ""} for i in range(count)]
+    roomclient.patch_state({"messages": messages})
+
+
+class Bus(ClientTest):
+    def setUp(self):
+        super().setUp()
+        unread(2)
+        self.start()
+        self.until("the name on the bus", lambda: gdbus("introspect", "--session", "-d", SERVICE, "-o",
+                                                        NOTIFICATION).returncode == 0)
+
+    def notice(self):
+        return next((window for window, (_, _, width, height) in self.desktop.windows()
+                     if (width, height) == NOTICE_SIZE), None)
+
+    def test_introspection_shows_the_interface_and_nothing_of_the_object(self):
+        node = ElementTree.fromstring(gdbus("introspect", "--session", "--xml", "-d", SERVICE, "-o",
+                                            NOTIFICATION).stdout)
+        own = [i for i in node.findall("interface") if not i.get("name").startswith("org.freedesktop.DBus.")]
+        self.assertEqual([i.get("name") for i in own], ["com.vantor.tarn.Notification"])
+        members = {kind: sorted(m.get("name") for m in own[0].findall(kind)) for kind in ("method", "signal", "property")}
+        self.assertEqual(members, {"method": ["AgencyNotify", "GioMount", "Notify"], "signal": ["onMessage"],
+                                   "property": []})
+
+    def test_message_opens_the_notice_dialog(self):
+        self.desktop.start_notifications()
+        self.assertEqual(push("zhangsan").returncode, 0)
+        self.until("the notification", lambda: "1" in self.desktop.run("dunstctl", "count", "displayed"))
+        self.desktop.run("dunstctl", "action")
+        self.until("the notice dialog", self.notice)
+        self.desktop.run("xdotool", "windowfocus", "--sync", self.notice(), "key", "Escape")
+        self.until("the dialog to hide", lambda: not self.notice())
+        self.assertIsNone(self.client.poll())
+
+    def test_message_for_somebody_else_is_not_shown(self):
+        self.desktop.start_notifications()
+        push("lisi")
+        roomclient.wait_syslog("message for another user not shown")
+        push("")
+        self.until("the notification", lambda: "1" in self.desktop.run("dunstctl", "count", "displayed"))
+
+    def test_balloon_where_the_service_is_missing(self):
+        before = len(self.desktop.windows())
+        push("zhangsan")
+        self.until("the balloon", lambda: len(self.desktop.windows()) > before)
+        self.assertFalse(any("neither a notification service" in line for line in self.messages()))
+
+    def test_devices_are_unmounted_before_the_reply(self):
+        subprocess.run(["mkdir", "-p", "/run/user/1000/gvfs/mtp:host=Foo_SER1"], check=True)
+        reply = gdbus("call", "--session", "-d", SERVICE, "-o", NOTIFICATION, "-m",
+                      "com.vantor.tarn.Notification.GioMount", "Foo", "Bar", "SER1", "1000")
+        self.assertEqual(reply.returncode, 0)
+        self.assertEqual(roomclient.record("process", name="gio")[0]["args"],
+                         ["mount", "-u", "/run/user/1000/gvfs/mtp:host=Foo_SER1"])
+
+
+class TakenName(ClientTest):
+    def test_client_lives_without_its_name(self):
+        owner = self.desktop.spawn(["/usr/bin/python3", "-c",
+                                    "import dbus; from dbus.mainloop.glib import DBusGMainLoop;"
+                                    "from gi.repository import GLib; DBusGMainLoop(set_as_default=True);"
+                                    f"dbus.SessionBus().request_name('{SERVICE}'); GLib.MainLoop().run()"])
+        self.until("the other owner", lambda: SERVICE in gdbus("call", "--session", "-d", "org.freedesktop.DBus", "-o",
+                                                               "/", "-m", "org.freedesktop.DBus.ListNames").stdout)
+        self.start()
+        line = roomclient.wait_syslog("cannot own")
+        self.assertRegex(line, re.compile("warning .*SessionHost cannot own"))
+        self.assertIsNone(self.client.poll())
+        self.assertIsNone(owner.poll())
+
+
+if __name__ == "__main__":
+    unittest.main()
