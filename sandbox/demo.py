@@ -116,7 +116,10 @@ class Demo:
         dialog = self.dialog(PASSWORD_SIZE)
         for old, name in (("wrong", "password-alert"), ("Zent@2026", None)):
             self.keys(dialog, "ctrl+a")
-            self.type(dialog, old + "\tNew@2026x\tNew@2026x")
+            for text in (old, "New@2026x", "New@2026x"):
+                self.type(dialog, text)
+                self.keys(dialog, "Tab")
+            self.keys(dialog, "shift+Tab")
             asked = len(roomclient.record("dbus", method="ModifyUserPassword"))
             self.keys(dialog, "Return")
             self.desktop.wait("the change", lambda: len(roomclient.record("dbus", method="ModifyUserPassword")) > asked)

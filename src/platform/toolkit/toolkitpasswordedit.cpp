@@ -38,7 +38,8 @@ public:
     {
         setObjectName(QStringLiteral("echoButton"));
         setCheckable(true);
-        setFocusPolicy(Qt::TabFocus);
+        // Not in the Tab order: Tab goes from one field to the next.
+        setFocusPolicy(Qt::NoFocus);
         setCursor(Qt::ArrowCursor);
         setAttribute(Qt::WA_Hover);
         resize(signSize, signSize);

@@ -1,13 +1,13 @@
 #include "resumedialog.h"
 
 #include "thirdscript.h"
+#include "toolkitframe.h"
 #include "toolkitlabel.h"
 #include "toolkitsuggestbutton.h"
 
 #include <QCloseEvent>
 #include <QDebug>
 #include <QDesktopServices>
-#include <QFrame>
 #include <QHBoxLayout>
 #include <QIcon>
 #include <QProcess>
@@ -54,7 +54,7 @@ void resumeDialog::createInterface()
     m_message = new ToolkitLabel(content);
     m_message->setFixedSize(210, 36);
     m_message->setWordWrap(true);
-    auto* line = new QFrame(content);
+    auto* line = new ToolkitFrame(content);
     line->setFrameShape(QFrame::VLine);
     line->setFixedSize(1, 28);
     auto* repair = new ToolkitSuggestButton(QStringLiteral("修复方法"), content);

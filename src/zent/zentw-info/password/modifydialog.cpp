@@ -6,6 +6,7 @@
 #include "loginname.h"
 #include "paths.h"
 #include "thirdscript.h"
+#include "toolkitframe.h"
 #include "toolkitlabel.h"
 #include "toolkitpasswordedit.h"
 #include "toolkitpushbutton.h"
@@ -17,7 +18,6 @@
 #include <QDebug>
 #include <QFile>
 #include <QFileInfo>
-#include <QFrame>
 #include <QHBoxLayout>
 #include <QIcon>
 #include <QJsonDocument>
@@ -87,7 +87,7 @@ void ModifyDialog::createDialog()
     m_cancel = new ToolkitPushButton(content);
     // The same name as the other button's: style sheets of the platform address both by it.
     m_cancel->setObjectName(QStringLiteral("confirm"));
-    auto* line = new QFrame(content);
+    auto* line = new ToolkitFrame(content);
     line->setObjectName(QStringLiteral("line"));
     line->setFrameShape(QFrame::VLine);
     line->setFixedSize(1, 30);

@@ -10,6 +10,7 @@
 #include "releasereply.h"
 #include "screens.h"
 #include "spinerwin.h"
+#include "toolkitframe.h"
 #include "toolkitlabel.h"
 #include "toolkitpasswordedit.h"
 #include "toolkitpushbutton.h"
@@ -20,7 +21,6 @@
 #include <QDBusPendingReply>
 #include <QDebug>
 #include <QFile>
-#include <QFrame>
 #include <QGSettings>
 #include <QHBoxLayout>
 #include <QIcon>
@@ -67,7 +67,7 @@ void closeGuarddialog::createContent()
     auto* close = new ToolkitPushButton(tr(" 关闭 "), content);
     close->setObjectName(QStringLiteral("close"));
     close->setFixedWidth(170);
-    auto* line = new QFrame(content);
+    auto* line = new ToolkitFrame(content);
     line->setObjectName(QStringLiteral("line"));
     line->setFrameShape(QFrame::VLine);
     line->setFixedSize(1, 28);

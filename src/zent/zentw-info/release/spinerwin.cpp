@@ -3,6 +3,7 @@
 #include "busproxy.h"
 #include "controlmanagerthread.h"
 #include "dbusnames.h"
+#include "toolkitframe.h"
 #include "toolkitlabel.h"
 #include "toolkitpushbutton.h"
 #include "toolkitspinner.h"
@@ -11,7 +12,6 @@
 #include <QCloseEvent>
 #include <QDBusMessage>
 #include <QDebug>
-#include <QFrame>
 #include <QHBoxLayout>
 #include <QIcon>
 #include <QVBoxLayout>
@@ -52,7 +52,7 @@ void spinerWin::createContent()
     m_spinner->hide();
     m_confirm = new ToolkitSuggestButton(tr("确定"), content);
     m_confirm->setFixedSize(kButtonSize);
-    auto* line = new QFrame(content);
+    auto* line = new ToolkitFrame(content);
     line->setObjectName(QStringLiteral("line"));
     line->setFrameShape(QFrame::VLine);
     line->setFixedSize(1, 28);

@@ -1,0 +1,17 @@
+#include "toolkitframe.h"
+
+#include <QPainter>
+
+ToolkitFrame::ToolkitFrame(QWidget* parent) : QFrame(parent)
+{
+}
+
+void ToolkitFrame::paintEvent(QPaintEvent* event)
+{
+    if (frameShape() != QFrame::HLine && frameShape() != QFrame::VLine)
+        return QFrame::paintEvent(event);
+    constexpr int lineAlpha = 40;
+    QColor color = palette().color(QPalette::WindowText);
+    color.setAlpha(lineAlpha);
+    QPainter(this).fillRect(rect(), color);
+}
