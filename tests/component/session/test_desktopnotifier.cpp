@@ -171,7 +171,8 @@ private slots:
             QStringLiteral("域管平台"),
             0U,
             "zentw-info",
-            QStringLiteral("<i>标题 & more"),
+            capabilities.contains("body-markup") ? QStringLiteral("&lt;i&gt;标题 &amp; more")
+                                                 : QStringLiteral("<i>标题 & more"),
             body,
             QStringList{"default", QStringLiteral("查看")},
             QVariantMap{{"desktop-entry", "zentw-info"}},

@@ -7,6 +7,7 @@
 #include "gethttpheader.h"
 #include "infowidget.h"
 #include "legacyqt.h"
+#include "noconfig.h"
 #include "paths.h"
 #include "replies.h"
 #include "urlquery.h"
@@ -21,7 +22,6 @@
 #include <QTimer>
 
 #include <cstdlib>
-#include <unistd.h>
 
 namespace
 {
@@ -39,17 +39,10 @@ void provokeOpenError(QFile& file)
     file.open(QIODevice::ReadOnly | QIODevice::Text);
 }
 
-void logNoConfig(const QFile& file)
-{
-    qInfo() << "no config.json to use, error code: " << file.error() << ", error detail: " << file.errorString()
-            << ", uid: " << getuid() << ", gid: " << getgid() << ", euid: " << geteuid() << ", egid: " << getegid();
-}
-
 void showNoConfig(const QFile& file)
 {
-    QMessageBox box(QMessageBox::Critical, QStringLiteral("域管终端提示"),
-                    QStringLiteral("读取%1失败，错误原因是：%2").arg(file.fileName(), file.errorString()),
-                    QMessageBox::Ok);
+    QMessageBox box(QMessageBox::Critical, zent::noconfig::kTitle,
+                    zent::noconfig::text(file.fileName(), file.errorString()), QMessageBox::Ok);
     box.setTextFormat(Qt::PlainText);
     box.exec();
 }
@@ -62,7 +55,7 @@ bool MainWindow::whetherJoinGuard()
     if (file.exists())
         return true;
     provokeOpenError(file);
-    logNoConfig(file);
+    zent::noconfig::describe(qInfo(), file);
     return false;
 }
 
@@ -71,7 +64,7 @@ void MainWindow::getConfig()
     QFile file(zent::kUserinfoPath);
     if (!file.exists()) {
         provokeOpenError(file);
-        logNoConfig(file);
+        zent::noconfig::describe(qInfo(), file);
         showNoConfig(file);
         std::_Exit(-1);
     }

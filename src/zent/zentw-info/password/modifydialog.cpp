@@ -110,10 +110,12 @@ void ModifyDialog::createDialog()
     connect(m_rePassword, &QLineEdit::textChanged, this, &ModifyDialog::onRepasswordeditTextchanged);
     connect(m_rePassword, &QLineEdit::editingFinished, this, &ModifyDialog::onRepasswordeditFinished);
     // An alert about passwords that are the same by now would contradict the button.
-    connect(m_rePassword, &QLineEdit::textChanged, this, [this](const QString& text) {
-        if (text == m_password->text())
-            onRepasswordeditFinished();
-    });
+    for (QLineEdit* edit : {m_password, m_rePassword}) {
+        connect(edit, &QLineEdit::textChanged, this, [this] {
+            if (m_rePassword->text() == m_password->text())
+                onRepasswordeditFinished();
+        });
+    }
     connect(m_confirm, &QPushButton::clicked, this, &ModifyDialog::modifyConfirm);
     connect(m_cancel, &QPushButton::clicked, this, &ModifyDialog::modifyClose);
 }
@@ -254,6 +256,8 @@ void ModifyDialog::hideEvent(QHideEvent* event)
         edit->setAlert(false);
         edit->hideAlertMessage();
     }
+    // The next opening starts at the top again.
+    m_oldPassword->setFocus();
     ToolkitDialog::hideEvent(event);
 }
 
@@ -300,10 +304,12 @@ bool ModifyDialog::analyseData(QByteArray* body)
     const QString probe = QStringLiteral("touch /tmp/demo.txt && echo %1 | su %2").arg(m_probePassword, m_userName);
     Q_UNUSED(probe)
     removePasswdCache();
+    // Whoever owns this dialog may delete it while a notice is open.
+    const QPointer<ModifyDialog> self = this;
     if (!reply->token.isEmpty())
         renewToken(reply->token);
-    const QPointer<ModifyDialog> self = this;
-    showNotice(QStringLiteral("密码修改成功"));
+    if (self)
+        showNotice(QStringLiteral("密码修改成功"));
     if (self)
         close();
     return true;
@@ -366,8 +372,9 @@ void ModifyDialog::onRestoreReadprocess()
     };
     const QString output = QString::fromLocal8Bit(m_restoreProcess->readAll());
     // Every part that matches is told, one after another.
+    const QPointer<ModifyDialog> self = this;
     for (const Outcome& outcome : outcomes) {
-        if (output.contains(outcome.part))
+        if (self && output.contains(outcome.part))
             showNotice(outcome.message);
     }
 }

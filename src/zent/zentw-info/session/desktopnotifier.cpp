@@ -129,11 +129,11 @@ void DesktopNotifier::onCapabilities(const QDBusPendingCall& call)
 
 void DesktopNotifier::send(const Message& message)
 {
-    const QString plainBody = body(message.sender, message.text);
+    // The title as well: services with markup are free to format it, and nothing pushed may act as markup anywhere.
+    const auto shown = [this](const QString& text) { return m_bodyMarkup ? text.toHtmlEscaped() : text; };
     QDBusMessage question = methodCall(QStringLiteral("Notify"));
-    // The title is never escaped: services take it as plain text even where the body is markup.
-    question << kApplicationName << kReplacesNone << kIconName << message.title
-             << (m_bodyMarkup ? plainBody.toHtmlEscaped() : plainBody) << QStringList{kDefaultAction, kActionLabel}
+    question << kApplicationName << kReplacesNone << kIconName << shown(message.title)
+             << shown(body(message.sender, message.text)) << QStringList{kDefaultAction, kActionLabel}
              << QVariantMap{{QStringLiteral("desktop-entry"), kIconName}} << kServerDecidesExpiry;
     call(question, [this, message, server = m_server](const QDBusPendingCall& answer) {
         if (server == m_server)
