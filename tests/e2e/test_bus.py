@@ -1,14 +1,17 @@
 """What the client offers on the session bus, and how a pushed message reaches the user."""
 
+import json
 import re
 import subprocess
 import xml.etree.ElementTree as ElementTree
 
-from clienttest import ClientTest, roomclient, unittest
+from clienttest import INFO_FILE, ClientTest, read, roomclient, unittest
 
 SERVICE = "com.vantor.tarn"
 NOTIFICATION = "/com/vantor/tarn/Notification"
+FULLZONE = "/com/vantor/tarn/Fullzone"
 NOTICE_SIZE = (428, 450)
+INTEGRITY_SIZE = (380, 160)
 
 
 def gdbus(*arguments):
@@ -34,18 +37,47 @@ class Bus(ClientTest):
         self.until("the name on the bus", lambda: gdbus("introspect", "--session", "-d", SERVICE, "-o",
                                                         NOTIFICATION).returncode == 0)
 
-    def notice(self):
-        return next((window for window, (_, _, width, height) in self.desktop.windows()
-                     if (width, height) == NOTICE_SIZE), None)
+    def window(self, wanted):
+        return next((window for window, (_, _, width, height) in self.desktop.windows() if (width, height) == wanted),
+                    None)
 
-    def test_introspection_shows_the_interface_and_nothing_of_the_object(self):
-        node = ElementTree.fromstring(gdbus("introspect", "--session", "--xml", "-d", SERVICE, "-o",
-                                            NOTIFICATION).stdout)
+    def notice(self):
+        return self.window(NOTICE_SIZE)
+
+    def members(self, path, interface):
+        """What the object offers beside the bus's own interfaces, which must be this interface alone."""
+        node = ElementTree.fromstring(gdbus("introspect", "--session", "--xml", "-d", SERVICE, "-o", path).stdout)
         own = [i for i in node.findall("interface") if not i.get("name").startswith("org.freedesktop.DBus.")]
-        self.assertEqual([i.get("name") for i in own], ["com.vantor.tarn.Notification"])
-        members = {kind: sorted(m.get("name") for m in own[0].findall(kind)) for kind in ("method", "signal", "property")}
-        self.assertEqual(members, {"method": ["AgencyNotify", "GioMount", "Notify"], "signal": ["onMessage"],
-                                   "property": []})
+        self.assertEqual([i.get("name") for i in own], [interface])
+        return {kind: sorted(m.get("name") for m in own[0].findall(kind)) for kind in ("method", "signal", "property")}
+
+    def test_introspection_shows_the_interfaces_and_nothing_of_the_objects(self):
+        self.assertEqual(self.members(NOTIFICATION, "com.vantor.tarn.Notification"),
+                         {"method": ["AgencyNotify", "GioMount", "Notify"], "signal": ["onMessage"], "property": []})
+        self.assertEqual(self.members(FULLZONE, "com.vantor.tarn.Fullzone"),
+                         {"method": ["Notify"], "signal": ["confirmed", "hidewin"], "property": []})
+
+    def test_integrity_dialog_follows_the_verification(self):
+        def report(errmsg, url):
+            reply = gdbus("call", "--session", "-d", SERVICE, "-o", FULLZONE, "-m", "com.vantor.tarn.Fullzone.Notify",
+                          errmsg, url)
+            self.assertEqual(reply.returncode, 0, reply.stderr)
+
+        report("open", "true")
+        roomclient.wait_syslog("terminalVarifyTimer Timer started!")
+        self.assertIsNone(self.window(INTEGRITY_SIZE))
+        report("校验失败", "/fix/page")
+        self.until("the integrity dialog", lambda: self.window(INTEGRITY_SIZE))
+        host = json.loads(read(INFO_FILE))["server_host"]
+        roomclient.wait_syslog(f'fix page url : "http://{host}/api/fix/page"')
+        self.desktop.run("xdotool", "windowfocus", "--sync", self.window(INTEGRITY_SIZE), "key", "Escape")
+        self.until("the dialog to hide", lambda: not self.window(INTEGRITY_SIZE))
+        report("校验失败", "/fix/page")
+        self.until("the dialog again", lambda: self.window(INTEGRITY_SIZE))
+        report("success", "false")
+        self.until("the dialog to close", lambda: not self.window(INTEGRITY_SIZE))
+        roomclient.wait_syslog("terminalVarifyTimer Timer stoped!")
+        self.assertIsNone(self.client.poll())
 
     def test_message_opens_the_notice_dialog(self):
         self.desktop.start_notifications()

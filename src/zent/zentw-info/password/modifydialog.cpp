@@ -4,6 +4,7 @@
 #include "filecontent.h"
 #include "filewrite.h"
 #include "loginname.h"
+#include "noconfig.h"
 #include "paths.h"
 #include "thirdscript.h"
 #include "toolkitframe.h"
@@ -26,8 +27,6 @@
 #include <QPointer>
 #include <QProcess>
 #include <QVBoxLayout>
-
-#include <unistd.h>
 
 namespace
 {
@@ -329,14 +328,11 @@ void ModifyDialog::renewToken(const QString& token)
     };
     QFile file(zent::kUserinfoPath);
     const auto fail = [&](const QString& reason) {
-        showNotice(QStringLiteral("读取%1失败，错误原因是：%2").arg(file.fileName(), reason),
-                   QStringLiteral("域管终端提示"));
+        showNotice(zent::noconfig::text(file.fileName(), reason), zent::noconfig::kTitle);
     };
     if (!file.open(QIODevice::ReadOnly)) {
         log(__LINE__) << "file open failed!";
-        log(__LINE__) << "no config.json to use, error code: " << file.error()
-                      << ", error detail: " << file.errorString() << ", uid: " << getuid() << ", gid: " << getgid()
-                      << ", euid: " << geteuid() << ", egid: " << getegid();
+        zent::noconfig::describe(log(__LINE__), file);
         return fail(file.errorString());
     }
     log(__LINE__) << "file open successfully!";
