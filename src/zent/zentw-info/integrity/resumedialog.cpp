@@ -79,6 +79,8 @@ void resumeDialog::createInterface()
 void resumeDialog::setRepairTitle(const QString& text)
 {
     m_message->setText(text);
+    // Two lines fit; the tool tip shows what a longer report has beyond them.
+    m_message->setToolTip(ToolkitLabel::plainToolTip(text));
 }
 
 void resumeDialog::setIpPort(const QString& host, const QString& port)
