@@ -1,27 +1,48 @@
 #pragma once
 
+#include <QMutex>
+#include <QMutexLocker>
 #include <QStringList>
 #include <QtGlobal>
 
-/// Collects every Qt log message for as long as it lives.
+/// Collects every Qt log message, of any thread, for as long as it lives.
 class LogCapture
 {
 public:
-    LogCapture() { s_lines().clear(), m_previous = qInstallMessageHandler(collect); }
+    LogCapture()
+    {
+        {
+            const QMutexLocker lock(&store().mutex);
+            store().lines.clear();
+        }
+        m_previous = qInstallMessageHandler(collect);
+    }
     ~LogCapture() { qInstallMessageHandler(m_previous); }
 
-    QStringList lines() const { return s_lines(); }
+    QStringList lines() const
+    {
+        const QMutexLocker lock(&store().mutex);
+        return store().lines;
+    }
     /// How many lines contain `text`.
     int count(const QString& text) const { return lines().filter(text).size(); }
     bool contains(const QString& text) const { return count(text) > 0; }
 
 private:
-    static QStringList& s_lines()
+    struct Store {
+        QMutex mutex;
+        QStringList lines;
+    };
+    static Store& store()
     {
-        static QStringList lines;
-        return lines;
+        static Store store;
+        return store;
     }
-    static void collect(QtMsgType, const QMessageLogContext&, const QString& message) { s_lines().append(message); }
+    static void collect(QtMsgType, const QMessageLogContext&, const QString& message)
+    {
+        const QMutexLocker lock(&store().mutex);
+        store().lines.append(message);
+    }
 
     QtMessageHandler m_previous;
 };
