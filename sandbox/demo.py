@@ -156,7 +156,8 @@ class Demo:
         spinner = self.dialog(SPINNER_SIZE)
         self.desktop.screenshot(os.path.join(self.directory, "release-running.png"), spinner)
         roomclient.wait_record(lambda entry: entry.get("path") == "/uim/v3/client/remove")
-        roomclient.wait_for(lambda: len(roomclient.record("process", name="fenx-cli.bash")) > 0)
+        # The worker's last step; the prompt follows at once.
+        roomclient.wait_syslog(".....execute hide-module:")
         self.picture("release-reboot", spinner)
 
 
