@@ -1,3 +1,4 @@
+#include "buspeer.h"
 #include "logcapture.h"
 #include "processrecord.h"
 #include "resumedialog.h"
@@ -10,7 +11,6 @@
 #include <QLabel>
 #include <QPushButton>
 #include <QTimer>
-#include <QXmlStreamReader>
 #include <QtTest>
 
 namespace
@@ -22,27 +22,6 @@ const QString kFrontEnd = QStringLiteral("fenx-cli.bash");
 const QString kFailure = QStringLiteral("校验失败");
 constexpr int kPeriodMs = 300000;
 
-/// The members of an interface in an introspection text: its methods with their arguments, its signals, its properties.
-QStringList members(const QString& xml, const QString& interface)
-{
-    QStringList found;
-    bool inside = false;
-    QXmlStreamReader reader(xml);
-    while (!reader.atEnd()) {
-        if (reader.readNext() != QXmlStreamReader::StartElement)
-            continue;
-        const QXmlStreamAttributes attributes = reader.attributes();
-        if (reader.name() == "interface")
-            inside = attributes.value("name") == interface;
-        else if (inside && reader.name() == "arg")
-            found.last() += ' ' + attributes.value("direction") + ':' + attributes.value("type");
-        else if (inside && reader.name() != "annotation")
-            found.append(reader.name() + ' ' + attributes.value("name"));
-    }
-    found.sort();
-    return found;
-}
-
 } // namespace
 
 /// The dialog as hosting code exports it, and as its own window.
@@ -50,8 +29,7 @@ class TestResumeDialog : public QObject
 {
     Q_OBJECT
 
-    QDBusConnection m_host = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "host");
-    QDBusConnection m_peer = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "peer");
+    BusPeer m_bus{kPath};
     std::unique_ptr<resumeDialog> m_dialog;
     QList<QUrl> m_opened;
     int m_heard = 0;
@@ -68,15 +46,6 @@ class TestResumeDialog : public QObject
     }
     static int runs() { return processrecord::entries(kFrontEnd).size(); }
 
-    QDBusMessage call(const QString& interface, const QString& method, const QVariantList& arguments = {})
-    {
-        QDBusMessage question = QDBusMessage::createMethodCall(m_host.baseService(), kPath, interface, method);
-        question.setArguments(arguments);
-        QDBusPendingCallWatcher watcher(m_peer.asyncCall(question));
-        QSignalSpy finished(&watcher, &QDBusPendingCallWatcher::finished);
-        return finished.wait() ? watcher.reply() : QDBusMessage::createError("none", "no reply");
-    }
-
 public slots:
     void take(const QUrl& url) { m_opened.append(url); }
     void hear() { ++m_heard; }
@@ -86,7 +55,7 @@ private slots:
     {
         QVERIFY2(qEnvironmentVariableIsSet("ROOM"), "runs inside a room only");
         QDesktopServices::setUrlHandler("http", this, "take");
-        QVERIFY(m_peer.connect(m_host.baseService(), kPath, kInterface, "hidewin", this, SLOT(hear())));
+        QVERIFY(m_bus.peer.connect(m_bus.host.baseService(), kPath, kInterface, "hidewin", this, SLOT(hear())));
     }
     void init()
     {
@@ -95,7 +64,7 @@ private slots:
         m_heard = 0;
         m_dialog = std::make_unique<resumeDialog>();
         m_dialog->setIpPort("10.0.0.1", "8443");
-        QVERIFY(m_host.registerObject(
+        QVERIFY(m_bus.host.registerObject(
             kPath, m_dialog.get(), QDBusConnection::ExportScriptableSlots | QDBusConnection::ExportScriptableSignals));
     }
     void cleanup() { m_dialog.reset(); }
@@ -250,28 +219,24 @@ private slots:
 
     void offersWhatItDescribes()
     {
-        const QDBusMessage reply = call("org.freedesktop.DBus.Introspectable", "Introspect");
-        const QString live = reply.arguments().value(0).toString();
-        const QString described = QString::fromUtf8(testfiles::read(ZENT_DATA_DIR "/com.vantor.tarn.Fullzone.xml"));
-        QCOMPARE(members(described, kInterface),
-                 QStringList({"method Notify in:s in:s", "signal confirmed", "signal hidewin"}));
-        QCOMPARE(members(live, kInterface), members(described, kInterface));
-        QXmlStreamReader reader(live);
-        while (!reader.atEnd()) {
-            if (reader.readNext() != QXmlStreamReader::StartElement || reader.name() != "interface")
-                continue;
-            const QString name = reader.attributes().value("name").toString();
-            QVERIFY2(name == kInterface || name.startsWith("org.freedesktop.DBus."), qPrintable(name));
-        }
+        const QDBusMessage reply = m_bus.call("org.freedesktop.DBus.Introspectable", "Introspect");
+        const QMap<QString, QStringList> live = BusPeer::members(reply.arguments().value(0).toString());
+        const QMap<QString, QStringList> described =
+            BusPeer::members(QString::fromUtf8(testfiles::read(ZENT_DATA_DIR "/com.vantor.tarn.Fullzone.xml")));
+        QCOMPARE(described.value(kInterface),
+                 QStringList({"method Notify(ss)", "signal confirmed()", "signal hidewin()"}));
+        QCOMPARE(live.value(kInterface), described.value(kInterface));
+        for (const QString& other : live.keys())
+            QVERIFY2(other == kInterface || other.startsWith("org.freedesktop.DBus."), qPrintable(other));
     }
 
     void callsReachOnlyNotify()
     {
-        QCOMPARE(call(kInterface, "Notify", {kFailure, "/fix"}).type(), QDBusMessage::ReplyMessage);
+        QCOMPARE(m_bus.call(kInterface, "Notify", {kFailure, "/fix"}).type(), QDBusMessage::ReplyMessage);
         QVERIFY(m_dialog->isVisible());
         for (const char* member : {"confirmCliked", "hideWindow", "close", "hide", "reject", "deleteLater"})
-            QCOMPARE(call(kInterface, member).errorName(), QString("org.freedesktop.DBus.Error.UnknownMethod"));
-        QCOMPARE(call(kInterface, "Notify", {1, "/fix"}).type(), QDBusMessage::ErrorMessage);
+            QCOMPARE(m_bus.call(kInterface, member).errorName(), QString("org.freedesktop.DBus.Error.UnknownMethod"));
+        QCOMPARE(m_bus.call(kInterface, "Notify", {1, "/fix"}).type(), QDBusMessage::ErrorMessage);
         QVERIFY(m_dialog->isVisible());
         QCOMPARE(m_opened.size(), 0);
     }

@@ -1,12 +1,8 @@
+#include "buspeer.h"
 #include "notify.h"
 #include "processrecord.h"
 
-#include <QDBusConnection>
 #include <QDBusMessage>
-#include <QDBusPendingCall>
-#include <QDBusPendingCallWatcher>
-#include <QMap>
-#include <QXmlStreamReader>
 #include <QtTest>
 
 #include <unistd.h>
@@ -17,36 +13,6 @@ namespace
 const QString kPath = QStringLiteral("/com/vantor/tarn/Notification");
 const QString kInterface = QStringLiteral("com.vantor.tarn.Notification");
 
-/// The members of every interface in an introspection text, each as "method Name(iss)" or "signal Name(iss)".
-QMap<QString, QStringList> members(const QString& xml)
-{
-    QMap<QString, QStringList> interfaces;
-    QString interface;
-    QXmlStreamReader reader(xml);
-    while (!reader.atEnd()) {
-        const auto token = reader.readNext();
-        const QStringRef element = reader.name();
-        if (token == QXmlStreamReader::StartElement) {
-            const QXmlStreamAttributes attributes = reader.attributes();
-            if (element == "interface")
-                interface = attributes.value("name").toString();
-            else if (element == "method" || element == "signal" || element == "property")
-                interfaces[interface].append(element + ' ' + attributes.value("name") + '(');
-            else if (element == "arg") {
-                QString& member = interfaces[interface].last();
-                // A signal's arguments can only go out, whether that is written or not.
-                const bool result = attributes.value("direction") == "out" && member.startsWith("method");
-                member += (result ? ">" : "") + attributes.value("type").toString();
-            }
-        } else if (token == QXmlStreamReader::EndElement && (element == "method" || element == "signal")) {
-            interfaces[interface].last() += ')';
-        }
-    }
-    for (QStringList& list : interfaces)
-        list.sort();
-    return reader.hasError() ? QMap<QString, QStringList>() : interfaces;
-}
-
 } // namespace
 
 /// The object as a peer on the bus meets it, exported the way the session host does.
@@ -55,18 +21,8 @@ class TestNotify : public QObject
     Q_OBJECT
 
     Notification m_notification;
-    QDBusConnection m_host = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "host");
-    QDBusConnection m_peer = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "peer");
+    BusPeer m_bus{kPath};
     QVector<QVariantList> m_heard;
-
-    QDBusMessage call(const QString& interface, const QString& method, const QVariantList& arguments = {})
-    {
-        QDBusMessage question = QDBusMessage::createMethodCall(m_host.baseService(), kPath, interface, method);
-        question.setArguments(arguments);
-        QDBusPendingCallWatcher watcher(m_peer.asyncCall(question));
-        QSignalSpy finished(&watcher, &QDBusPendingCallWatcher::finished);
-        return finished.wait() ? watcher.reply() : QDBusMessage::createError("none", "no reply");
-    }
 
 public slots:
     void hear(const QDBusMessage& signal) { m_heard.append(signal.arguments()); }
@@ -75,19 +31,20 @@ private slots:
     void initTestCase()
     {
         QVERIFY2(qEnvironmentVariableIsSet("ROOM"), "runs inside a room only");
-        QVERIFY(m_host.registerObject(
+        QVERIFY(m_bus.host.registerObject(
             kPath, &m_notification, QDBusConnection::ExportScriptableSlots | QDBusConnection::ExportScriptableSignals));
-        QVERIFY(m_peer.connect(m_host.baseService(), kPath, kInterface, "onMessage", this, SLOT(hear(QDBusMessage))));
+        QVERIFY(m_bus.peer.connect(m_bus.host.baseService(), kPath, kInterface, "onMessage", this,
+                                   SLOT(hear(QDBusMessage))));
     }
 
     void init() { m_heard.clear(); }
 
     void offersWhatItDescribes()
     {
-        const QDBusMessage reply = call("org.freedesktop.DBus.Introspectable", "Introspect");
-        const QMap<QString, QStringList> live = members(reply.arguments().value(0).toString());
+        const QDBusMessage reply = m_bus.call("org.freedesktop.DBus.Introspectable", "Introspect");
+        const QMap<QString, QStringList> live = BusPeer::members(reply.arguments().value(0).toString());
         const QMap<QString, QStringList> described =
-            members(QString::fromUtf8(testfiles::read(ZENT_DATA_DIR "/com.vantor.tarn.Notification.xml")));
+            BusPeer::members(QString::fromUtf8(testfiles::read(ZENT_DATA_DIR "/com.vantor.tarn.Notification.xml")));
         QCOMPARE(described.keys(), QStringList{kInterface});
         QCOMPARE(described.value(kInterface).size(), 4);
         QCOMPARE(live.value(kInterface), described.value(kInterface));
@@ -106,10 +63,10 @@ private slots:
     {
         QFETCH(QVariantList, arguments);
         QSignalSpy emitted(&m_notification, &Notification::onMessage);
-        QCOMPARE(call(kInterface, "Notify", arguments).type(), QDBusMessage::ReplyMessage);
+        QCOMPARE(m_bus.call(kInterface, "Notify", arguments).type(), QDBusMessage::ReplyMessage);
         QCOMPARE(static_cast<QVariantList>(emitted.value(0)), arguments);
         QTRY_VERIFY(!m_heard.isEmpty());
-        QCOMPARE(call(kInterface, "AgencyNotify", {"a", "b"}).type(), QDBusMessage::ReplyMessage);
+        QCOMPARE(m_bus.call(kInterface, "AgencyNotify", {"a", "b"}).type(), QDBusMessage::ReplyMessage);
         QCOMPARE(emitted.size(), 1);
         QCOMPARE(m_heard, QVector<QVariantList>{arguments});
     }
@@ -123,7 +80,7 @@ private slots:
     void membersOfTheObjectStayHidden()
     {
         QFETCH(QString, method);
-        QCOMPARE(call(kInterface, method).errorName(), QString("org.freedesktop.DBus.Error.UnknownMethod"));
+        QCOMPARE(m_bus.call(kInterface, method).errorName(), QString("org.freedesktop.DBus.Error.UnknownMethod"));
     }
 
     void gioMountAnswersWhenGioHasRun()
@@ -135,12 +92,12 @@ private slots:
         const QString ended = qEnvironmentVariable("ROOM") + "/gio.ended";
         testfiles::write(qEnvironmentVariable("ROOM") + "/standin/gio.hook", "sleep 0.3; : > " + ended.toUtf8());
         const QVariantList arguments{"A", "B", "SN1", QString::number(getuid())};
-        QCOMPARE(call(kInterface, "GioMount", arguments).type(), QDBusMessage::ReplyMessage);
+        QCOMPARE(m_bus.call(kInterface, "GioMount", arguments).type(), QDBusMessage::ReplyMessage);
         QVERIFY(QFile::exists(ended));
         QCOMPARE(processrecord::words(processrecord::entries("gio").value(0)),
                  QStringList({"mount", "-u", root + "mtp:host=A_B_SN1"}));
         testfiles::remove(root);
-        QCOMPARE(call(kInterface, "GioMount", arguments).type(), QDBusMessage::ReplyMessage);
+        QCOMPARE(m_bus.call(kInterface, "GioMount", arguments).type(), QDBusMessage::ReplyMessage);
         QCOMPARE(processrecord::entries("gio").size(), 1);
     }
 };
