@@ -75,14 +75,12 @@ private slots:
     void sceneBox();
     void links_data();
     void links();
-    void onTop();
     void dateLines_data();
     void dateLines();
     void everythingFits_data();
     void everythingFits();
     void legibleOnDarkDesktop();
     void tabOrder();
-    void iconButton();
 };
 
 void TestPanel::fieldsReachTheirRows()
@@ -235,23 +233,6 @@ void TestPanel::links()
     QCOMPARE(removal.count(), showRelease ? 1 : 0);
 }
 
-void TestPanel::onTop()
-{
-    Window window(true);
-    window.show();
-    auto* box = window.panel->findChild<QCheckBox*>(QStringLiteral("onTop"));
-    for (const bool wanted : {true, false}) {
-        window.move(3, 4);
-        box->setChecked(wanted);
-        QCOMPARE(bool(window.windowFlags() & Qt::WindowStaysOnTopHint), wanted);
-        QVERIFY(window.windowFlags() & Qt::FramelessWindowHint && window.windowType() == Qt::Tool);
-        QVERIFY(window.isVisible());
-        QVERIFY(QTest::qWaitForWindowActive(&window));
-        const QSize screen = QGuiApplication::primaryScreen()->geometry().size();
-        QCOMPARE(window.pos(), QPoint(screen.width() - window.width(), screen.height() - window.height()));
-    }
-}
-
 void TestPanel::dateLines_data()
 {
     QTest::addColumn<QLocale>("locale");
@@ -372,21 +353,6 @@ void TestPanel::tabOrder()
     const QStringList expected = {QStringLiteral("LoginInfo"), QStringLiteral("scenes"), QStringLiteral("onTop"),
                                   QStringLiteral("closeGuard"), QStringLiteral("changePassword")};
     QCOMPARE(visited, expected);
-}
-
-void TestPanel::iconButton()
-{
-    IconButton button(nullptr);
-    button.setIconImg(QStringLiteral(":/images/title.svg"));
-    button.setText(QStringLiteral("<b>消息</b>"));
-    QCOMPARE(label(button, "label_icon")->styleSheet(), QStringLiteral("QLabel{border-image:url(:/images/title.svg)}"));
-    QCOMPARE(label(button, "label_text")->text(), QStringLiteral("<b>消息</b>"));
-    QCOMPARE(label(button, "label_text")->textFormat(), Qt::PlainText);
-    auto* layout = button.findChild<QHBoxLayout*>(QStringLiteral("horizontalLayout"));
-    QVERIFY(layout && layout->stretch(0) == 1 && layout->stretch(1) == 3);
-    button.show();
-    // A click on the text is a click on the button.
-    QVERIFY(!button.childAt(label(button, "label_text")->geometry().center()));
 }
 
 int main(int argc, char** argv)

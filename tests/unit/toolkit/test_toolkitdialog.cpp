@@ -53,7 +53,6 @@ private slots:
     void closingAsksTheCloseEvent();
     void buttons();
     void returnPressesNoButtonByItself();
-    void windowTitleShows();
     void keepsItsFrame_data();
     void keepsItsFrame();
     void contentIsWhole_data();
@@ -62,7 +61,6 @@ private slots:
     void messageIsLiteralAndWhole();
     void surfaceFollowsTheThemeUnlessPinned();
     void alertMovesNothing();
-    void alertMessageEnds();
     void hiddenPasswordStaysInside();
     void spinnerSleepsUnseen();
 };
@@ -158,17 +156,6 @@ void TestToolkitDialog::returnPressesNoButtonByItself()
     button->setDefault(true);
     QTest::keyClick(edit, Qt::Key_Return);
     QCOMPARE(clicks.count(), 2);
-}
-
-void TestToolkitDialog::windowTitleShows()
-{
-    ToolkitDialog dialog;
-    auto* titlebar = dialog.findChild<ToolkitTitlebar*>();
-    dialog.setTitle(QStringLiteral("消息详情"));
-    QCOMPARE(dialog.windowTitle(), QStringLiteral("消息详情"));
-    QCOMPARE(titlebar->title(), QStringLiteral("消息详情"));
-    dialog.setWindowTitle(QStringLiteral("修改密码"));
-    QCOMPARE(titlebar->title(), QStringLiteral("修改密码"));
 }
 
 void TestToolkitDialog::keepsItsFrame_data()
@@ -297,22 +284,6 @@ void TestToolkitDialog::alertMovesNothing()
         QVERIFY(edit->isAlert());
         edit->hideAlertMessage();
     }
-}
-
-void TestToolkitDialog::alertMessageEnds()
-{
-    ToolkitDialog dialog;
-    auto* edit = new ToolkitLineEdit;
-    dialog.addContent(edit);
-    dialog.show();
-    edit->showAlertMessage(QStringLiteral("一"), 0);
-    edit->showAlertMessage(QStringLiteral("二"), 20);
-    QCOMPARE(edit->alertMessage(), QStringLiteral("二"));
-    QTRY_VERIFY(edit->alertMessage().isEmpty());
-    QTRY_VERIFY(!dialog.findChild<ToolkitLabel*>(QStringLiteral("alertBubble")));
-    edit->showAlertMessage(QStringLiteral("三"), 0);
-    dialog.hide();
-    QVERIFY(edit->alertMessage().isEmpty());
 }
 
 void TestToolkitDialog::hiddenPasswordStaysInside()

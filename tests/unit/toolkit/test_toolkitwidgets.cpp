@@ -19,14 +19,10 @@ class TestToolkitWidgets : public QObject
 
 private slots:
     void buttonBoxIsExclusive();
-    void buttonBoxReplacesItsButtons();
     void toolTipsReadAsGiven_data();
     void toolTipsReadAsGiven();
-    void labelShrinksToFit();
-    void titlebarDragsAndCloses();
     void palettesAreLegible_data();
     void palettesAreLegible();
-    void blurFrameSurface();
     void platformChoice_data();
     void platformChoice();
 };
@@ -60,19 +56,6 @@ void TestToolkitWidgets::buttonBoxIsExclusive()
     QCOMPARE(clicked, QList<QAbstractButton*>({second, first, second, second}));
 }
 
-void TestToolkitWidgets::buttonBoxReplacesItsButtons()
-{
-    ToolkitButtonBox box;
-    QPointer<QAbstractButton> kept = new ToolkitButtonBoxButton(QStringLiteral("一"));
-    QPointer<QAbstractButton> dropped = new ToolkitButtonBoxButton(QStringLiteral("二"));
-    box.setButtonList({kept, dropped}, true);
-    auto* added = new ToolkitButtonBoxButton(QStringLiteral("三"));
-    box.setButtonList({added, kept}, false);
-    QVERIFY(kept && !dropped);
-    QCOMPARE(box.buttonList(), QList<QAbstractButton*>({added, kept}));
-    QVERIFY(!kept->isCheckable() && !added->isCheckable());
-}
-
 void TestToolkitWidgets::toolTipsReadAsGiven_data()
 {
     QTest::addColumn<QString>("text");
@@ -95,64 +78,6 @@ void TestToolkitWidgets::toolTipsReadAsGiven()
         shown = document.toPlainText();
     }
     QCOMPARE(shown, text);
-}
-
-void TestToolkitWidgets::labelShrinksToFit()
-{
-    ToolkitLabel label(QStringLiteral("2026年09月30日 Wednesday"));
-    label.setFixedWidth(150);
-    QFont font = label.font();
-    font.setPixelSize(17);
-    label.setFont(font);
-    QVERIFY(label.fontMetrics().horizontalAdvance(label.text()) > label.width());
-    label.shrinkFontToWidth();
-    QVERIFY(label.fontMetrics().horizontalAdvance(label.text()) <= label.width());
-    QVERIFY(label.font().pixelSize() >= 8);
-    QFont larger = label.font();
-    larger.setPixelSize(larger.pixelSize() + 1);
-    QVERIFY(QFontMetrics(larger).horizontalAdvance(label.text()) > label.width());
-}
-
-void TestToolkitWidgets::titlebarDragsAndCloses()
-{
-    QWidget window(nullptr, Qt::FramelessWindowHint);
-    auto* bar = new ToolkitTitlebar(&window);
-    bar->setMenuVisible(false);
-    bar->setFixedHeight(50);
-    auto* layout = new QVBoxLayout(&window);
-    layout->setContentsMargins(0, 0, 0, 0);
-    layout->addWidget(bar);
-    window.setGeometry(100, 100, 300, 50);
-    window.show();
-    QVERIFY(QTest::qWaitForWindowExposed(&window));
-    QSignalSpy dragged(bar, &ToolkitTitlebar::windowDragged);
-    const QPoint start = window.pos();
-
-    const auto sendMouse = [&](QEvent::Type type, const QPoint& global, Qt::MouseButton button) {
-        QMouseEvent event(type, bar->mapFromGlobal(global), global, button,
-                          type == QEvent::MouseButtonRelease ? Qt::NoButton : Qt::LeftButton, Qt::NoModifier);
-        QCoreApplication::sendEvent(bar, &event);
-    };
-    const QPoint press = bar->mapToGlobal(QPoint(40, 20));
-    sendMouse(QEvent::MouseButtonPress, press, Qt::LeftButton);
-    sendMouse(QEvent::MouseMove, press + QPoint(2, 1), Qt::NoButton);
-    QCOMPARE(window.pos(), start);
-    for (const QPoint& step : {QPoint(30, 10), QPoint(60, 25), QPoint(37, 21)})
-        sendMouse(QEvent::MouseMove, press + step, Qt::NoButton);
-    sendMouse(QEvent::MouseButtonRelease, press + QPoint(37, 21), Qt::LeftButton);
-    QCOMPARE(window.pos(), start + QPoint(37, 21));
-    QCOMPARE(dragged.count(), 1);
-
-    QToolButton* close = nullptr;
-    for (QToolButton* button : bar->findChildren<QToolButton*>()) {
-        if (button->isVisible() && button->accessibleName() == QStringLiteral("关闭"))
-            close = button;
-        else
-            QVERIFY(!button->isVisible());
-    }
-    QVERIFY(close);
-    QTest::mouseClick(close, Qt::LeftButton);
-    QVERIFY(!window.isVisible());
 }
 
 namespace
@@ -198,37 +123,6 @@ void TestToolkitWidgets::palettesAreLegible()
             QVERIFY2(measured >= 4.5, qPrintable(QStringLiteral("role %1: %2").arg(pair.first).arg(measured)));
         }
     }
-}
-
-void TestToolkitWidgets::blurFrameSurface()
-{
-    const QPalette before = QApplication::palette();
-    QApplication::setPalette(ThemeHelper::palette(ThemeHelper::DarkType));
-    ToolkitBlurFrame frame;
-    ToolkitLabel child(&frame);
-    const QColor onLight = child.palette().color(QPalette::WindowText);
-    frame.setMaskColor(QColor(30, 30, 30));
-    const QColor onDark = child.palette().color(QPalette::WindowText);
-    QApplication::setPalette(before);
-    QCOMPARE(onLight, QColor(Qt::black));
-    QVERIFY(onDark.lightness() > 200);
-    QVERIFY(frame.windowFlags() & Qt::FramelessWindowHint);
-
-    const QList<QPair<int, int>> alphas = {{-1, 0}, {0, 0}, {128, 128}, {255, 255}, {999, 255}};
-    for (const auto& alpha : alphas) {
-        frame.setMaskAlpha(alpha.first);
-        QCOMPARE(frame.maskAlpha(), alpha.second);
-    }
-    // Nothing composites here: opaque up to the edge, and cut to shape.
-    frame.setMaskAlpha(100);
-    frame.resize(100, 80);
-    frame.show();
-    QVERIFY(QTest::qWaitForWindowExposed(&frame));
-    QVERIFY(!frame.mask().contains(QPoint(0, 0)) && !frame.mask().contains(QPoint(99, 79)));
-    QVERIFY(frame.mask().contains(QPoint(50, 0)) && frame.mask().contains(QPoint(99, 40)));
-    QCOMPARE(frame.grab().toImage().pixelColor(50, 40), QColor(30, 30, 30));
-    frame.resize(200, 80);
-    QVERIFY(frame.mask().contains(QPoint(150, 40)) && !frame.mask().contains(QPoint(199, 0)));
 }
 
 void TestToolkitWidgets::platformChoice_data()
