@@ -1,5 +1,6 @@
 #pragma once
 
+#include <QDateTime>
 #include <QEventLoop>
 #include <QJsonArray>
 #include <QJsonDocument>
@@ -29,6 +30,21 @@ public:
         call("POST", "faults", {{"match", match}, {"action", action}});
     }
     void clearFaults() { call("DELETE", "faults"); }
+    /// Leaves the user that many unread messages with the uuids "0", "1", ..., each a minute younger than the former.
+    void setUnread(int count, const QString& user = QStringLiteral("zhangsan"))
+    {
+        const QDateTime start(QDate(2026, 11, 24), QTime(), Qt::UTC);
+        QJsonArray messages;
+        for (int i = 0; i < count; ++i)
+            messages.append(QJsonObject{{"uuid", QString::number(i)},
+                                        {"uid", user},
+                                        {"send_uid", QStringLiteral("<b>管理员</b>")},
+                                        {"title", QStringLiteral("<i>通知</i> %1 %2").arg(i)},
+                                        {"content", "text"},
+                                        {"created_at", start.addSecs(60 * i).toString(Qt::ISODate)},
+                                        {"read_at", ""}});
+        patchState({{"messages", messages}});
+    }
 
 private:
     QJsonDocument call(const QByteArray& verb, const QString& what, const QJsonObject& body = {})

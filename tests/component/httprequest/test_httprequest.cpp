@@ -4,26 +4,12 @@
 #include "paths.h"
 #include "platformcontrol.h"
 #include "testfiles.h"
+#include "testrows.h"
 
 #include <QSignalSpy>
-#include <QtTest>
 
 #include <functional>
 
-namespace
-{
-
-/// What one operation must send: method, path, raw query, keys of the body.
-struct Sent {
-    QString method;
-    QString path;
-    QString query;
-    QStringList bodyKeys;
-};
-
-} // namespace
-
-Q_DECLARE_METATYPE(Sent)
 using Operation = std::function<void(HttpRequest&)>;
 Q_DECLARE_METATYPE(Operation)
 
@@ -32,16 +18,16 @@ class TestHttpRequest : public QObject
     Q_OBJECT
 
     PlatformControl m_platform;
+    HttpRequest* const m_client = HttpRequest::GetInstance();
 
-    void serveRule(const QString& rule)
+    void answer(const QString& path, int status, const QJsonObject& body)
     {
-        const QByteArray inner = QJsonDocument(QJsonObject{{"regular_expression", rule}}).toJson();
-        serveRuleMessage(QString::fromUtf8(inner));
+        const QString text = QString::fromUtf8(QJsonDocument(body).toJson());
+        m_platform.addFault({{"path", "/uim/v3/client/" + path}}, {{"status", status}, {"body", text}});
     }
-    void serveRuleMessage(const QString& message)
+    static QString rule(const QString& expression)
     {
-        const QByteArray body = QJsonDocument(QJsonObject{{"code", 0}, {"message", message}}).toJson();
-        m_platform.addFault({{"path", "/uim/v3/client/config"}}, {{"status", 200}, {"body", QString::fromUtf8(body)}});
+        return QString::fromUtf8(QJsonDocument(QJsonObject{{"regular_expression", expression}}).toJson());
     }
 
 private slots:
@@ -64,74 +50,62 @@ private slots:
 
     void operations_data()
     {
-        QTest::addColumn<Operation>("operation");
-        QTest::addColumn<QByteArray>("signal");
-        QTest::addColumn<Sent>("sent");
-        const auto row = [](const char* name, const char* signal, Sent sent, Operation operation) {
-            QTest::newRow(name) << operation << QByteArray(signal) << sent;
+        addColumns<Operation, QString, QString, QString>("operation", "signal", "sent", "bodyKeys");
+        const auto row = [](const char* name, const char* sent, const char* keys, const char* signal, Operation run) {
+            addRow(name, run, signal, sent, keys);
         };
-        row("ca", SIGNAL(sigCaCert(int, QString)), {"GET", "/apiauth/v1/client/ca_cert", "", {}},
+        row("ca", "GET /apiauth/v1/client/ca_cert?", "", SIGNAL(sigCaCert(int, QString)),
             [](HttpRequest& r) { r.getCaCert("server.zent.test", "443"); });
-        row("join state", SIGNAL(sigMacheineCheck(int, QString)),
-            {"GET", "/uim/v3/client/status", "machine_id=m-1&keyword=join&username=a%26b", {}},
+        const char* checked = SIGNAL(sigMacheineCheck(int, QString));
+        row("join state", "GET /uim/v3/client/status?machine_id=m-1&keyword=join&username=a%26b", "", checked,
             [](HttpRequest& r) { r.getMacheineCheck(static_cast<MachineState>(0), "a&b"); });
-        row("remove state", SIGNAL(sigMacheineCheck(int, QString)),
-            {"GET", "/uim/v3/client/status", "machine_id=m-1&keyword=remove&username=a", {}},
+        row("remove state", "GET /uim/v3/client/status?machine_id=m-1&keyword=remove&username=a", "", checked,
             [](HttpRequest& r) { r.getMacheineCheck(static_cast<MachineState>(1), "a"); });
-        row("other state", SIGNAL(sigMacheineCheck(int, QString)),
-            {"GET", "/uim/v3/client/status", "machine_id=m-1&username=a", {}},
+        row("other state", "GET /uim/v3/client/status?machine_id=m-1&username=a", "", checked,
             [](HttpRequest& r) { r.getMacheineCheck(static_cast<MachineState>(2), "a"); });
-        row("account", SIGNAL(sigCheckAccountPwd(int, QString)),
-            {"POST", "/uim/v3/client/auth", "", {"password", "username"}},
+        row("account", "POST /uim/v3/client/auth?", "password username", SIGNAL(sigCheckAccountPwd(int, QString)),
             [](HttpRequest& r) { r.postCheckAccountPwd("a", "p"); });
-        row("join", SIGNAL(sigJoinControl(int, QString)),
-            {"POST", "/uim/v3/client/join", "", {"mac", "machine_id", "name", "username"}},
+        row("join", "POST /uim/v3/client/join?", "mac machine_id name username", SIGNAL(sigJoinControl(int, QString)),
             [](HttpRequest& r) { r.postJoinControl("a"); });
-        row("quit", SIGNAL(sigQuitControl(int, QString)),
-            {"POST", "/uim/v3/client/remove", "", {"mac", "machine_id", "username"}},
+        row("quit", "POST /uim/v3/client/remove?", "mac machine_id username", SIGNAL(sigQuitControl(int, QString)),
             [](HttpRequest& r) { r.postQuitControl("a"); });
-        row("remove status", SIGNAL(sigRemoveStatus(int, QString)),
-            {"POST", "/uim/v3/client/remove_status", "", {"machine_id", "password", "username"}},
-            [](HttpRequest& r) { r.postRemoveStatus("a", "p"); });
-        row("company", SIGNAL(sigCompanyName(int, QString)), {"GET", "/uim/v3/client/uim_department/id", "id=1", {}},
+        row("remove status", "POST /uim/v3/client/remove_status?", "machine_id password username",
+            SIGNAL(sigRemoveStatus(int, QString)), [](HttpRequest& r) { r.postRemoveStatus("a", "p"); });
+        row("company", "GET /uim/v3/client/uim_department/id?id=1", "", SIGNAL(sigCompanyName(int, QString)),
             [](HttpRequest& r) { r.getCompanyName(); });
-        row("user", SIGNAL(sigUserInfo(int, QString)),
-            {"GET", "/uim/v3/client/account", "", {"machine_id", "username"}},
+        row("user", "GET /uim/v3/client/account?", "machine_id username", SIGNAL(sigUserInfo(int, QString)),
             [](HttpRequest& r) { r.getUserInfo("a"); });
     }
     void operations()
     {
         QFETCH(Operation, operation);
-        QFETCH(QByteArray, signal);
-        QFETCH(Sent, sent);
-        HttpRequest* client = HttpRequest::GetInstance();
-        QSignalSpy spy(client, signal.constData());
-        operation(*client);
+        QFETCH(QString, signal);
+        QFETCH(QString, sent);
+        QFETCH(QString, bodyKeys);
+        QSignalSpy spy(m_client, qPrintable(signal));
+        operation(*m_client);
         // Synchronous: the signal has come before the operation returned.
         QCOMPARE(spy.count(), 1);
         QCOMPARE(spy.first().at(0).toInt(), 200);
         QVERIFY(spy.first().at(1).toString().startsWith('{'));
 
         const QJsonObject request = m_platform.record("http").value(0);
-        QCOMPARE(request.value("method").toString(), sent.method);
-        QCOMPARE(request.value("path").toString(), sent.path);
-        QCOMPARE(request.value("raw_query").toString(), sent.query);
-        const QByteArray body = request.value("body").toString().toUtf8();
-        QCOMPARE(QJsonDocument::fromJson(body).object().keys(), sent.bodyKeys);
+        const auto text = [&request](const char* key) { return request.value(QLatin1String(key)).toString(); };
+        QCOMPARE(text("method") + ' ' + text("path") + '?' + text("raw_query"), sent);
+        const QJsonObject body = QJsonDocument::fromJson(text("body").toUtf8()).object();
+        QCOMPARE(body.keys().join(' '), bodyKeys);
         const QJsonObject headers = request.value("headers").toObject();
-        QCOMPARE(headers.value("content-type").toString(), body.isEmpty() ? QString() : QString("application/json"));
+        QCOMPARE(headers.value("content-type").toString(), QString(bodyKeys.isEmpty() ? "" : "application/json"));
         QVERIFY(!headers.contains("x-lumo-version"));
         QVERIFY(!request.value("client_certificate").isNull());
     }
 
     void macComesFromThePrimaryConnection()
     {
-        const QString mac = QStringLiteral("52:54:00:aa:bb:cc");
         m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}},
-                            {{"value", QStringLiteral(R"([{"IsPrimaryConnection": false, "HwAddress": "x"},
-                                {"IsPrimaryConnection": true, "HwAddress": "%1"}])")
-                                           .arg(mac)}});
-        QCOMPARE(FileConfig::GetInstance()->getMacAddress(), mac);
+                            {{"value", R"([{"IsPrimaryConnection": false, "HwAddress": "x"},
+                                {"IsPrimaryConnection": true, "HwAddress": "52:54"}])"}});
+        QCOMPARE(FileConfig::GetInstance()->getMacAddress(), QStringLiteral("52:54"));
         m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}}, {{"error", "com.vantor.Error.Failed"}});
         LogCapture log;
         QCOMPARE(FileConfig::GetInstance()->getMacAddress(), QString());
@@ -140,10 +114,9 @@ private slots:
 
     void failedRequestStillSignals()
     {
-        HttpRequest* client = HttpRequest::GetInstance();
         m_platform.addFault({{"path", "/uim/v3/client/account"}}, {{"drop", "before"}});
-        QSignalSpy spy(client, &HttpRequest::sigUserInfo);
-        client->getUserInfo("a");
+        QSignalSpy spy(m_client, &HttpRequest::sigUserInfo);
+        m_client->getUserInfo("a");
         QCOMPARE(spy.count(), 1);
         QVERIFY(spy.first().at(0).toInt() < 0);
         QCOMPARE(spy.first().at(1).toString(), QString());
@@ -151,80 +124,51 @@ private slots:
 
     void namingRule_data()
     {
-        QTest::addColumn<QString>("rule");
-        QTest::addColumn<QString>("name");
-        QTest::addColumn<bool>("accepted");
-        QTest::addColumn<QString>("message");
+        addColumns<QString, QString, bool, QString>("message", "name", "accepted", "said");
         const QString refused = QStringLiteral("终端别名不符合正则安全规则!!");
-        QTest::newRow("covers the name") << "[a-z]+"
-                                         << "abc" << true << "";
-        QTest::newRow("in slashes") << "/[a-z]+/"
-                                    << "abc" << true << "";
-        QTest::newRow("partial match") << "[a-z]+"
-                                       << "abc1" << false << refused;
-        QTest::newRow("match inside only") << "[0-9]"
-                                           << "a1b" << false << refused;
-        QTest::newRow("case-sensitive") << "[a-z]+"
-                                        << "ABC" << false << refused;
-        QTest::newRow("no match") << "[0-9]+"
-                                  << "abc" << false << refused;
-        QTest::newRow("only a slash") << "/"
-                                      << "abc" << false << "";
-        QTest::newRow("invalid") << "[a-z"
-                                 << "abc" << false << QStringLiteral("正则表达式不合法");
+        addRow("covers the name", rule("[a-z]+"), "abc", true, "");
+        addRow("in slashes", rule("/[a-z]+/"), "abc", true, "");
+        addRow("partial match", rule("[a-z]+"), "abc1", false, refused);
+        addRow("match inside only", rule("[0-9]"), "a1b", false, refused);
+        addRow("case-sensitive", rule("[a-z]+"), "ABC", false, refused);
+        addRow("only a slash", rule("/"), "abc", false, "");
+        addRow("invalid", rule("[a-z"), "abc", false, QStringLiteral("正则表达式不合法"));
+        addRow("broken inner text", "[1,", "abc", false, QStringLiteral("域管服务配置失败，请重试"));
+        addRow("no rule", "{}", "abc", false, QStringLiteral("服务端返回终端规则数据为空"));
     }
     void namingRule()
     {
-        QFETCH(QString, rule);
+        QFETCH(QString, message);
         QFETCH(QString, name);
         QFETCH(bool, accepted);
-        QFETCH(QString, message);
-        serveRule(rule);
-        HttpRequest::GetInstance()->getCaCert("server.zent.test", "443");
-        QString said;
-        QCOMPARE(HttpRequest::GetInstance()->checkPcName(name, said), accepted);
-        QCOMPARE(said, message);
-        for (const QJsonObject& request : m_platform.record("http"))
-            QVERIFY(request.value("path").toString() != QStringLiteral("/uim/v3/client/pc/verify/name"));
+        QFETCH(QString, said);
+        answer("config", 200, {{"code", 0}, {"message", message}});
+        m_client->getCaCert("server.zent.test", "443");
+        QString text;
+        QCOMPARE(m_client->checkPcName(name, text), accepted);
+        QCOMPARE(text, said);
+        QVERIFY(!m_platform.record("http").last().value("path").toString().endsWith("/verify/name"));
     }
 
+    void emptyRuleLeavesItToTheServer_data()
+    {
+        addColumns<int, int, bool, QString>("status", "code", "accepted", "said");
+        addRow("accepted", 200, 0, true, "said");
+        addRow("taken", 200, 4, false, "said");
+        addRow("error with a good body", 500, 0, false, QStringLiteral("域管服务配置失败，请重试"));
+    }
     void emptyRuleLeavesItToTheServer()
     {
-        serveRule(QString());
-        m_platform.addFault({{"path", "/uim/v3/client/pc/verify/name"}},
-                            {{"status", 200}, {"body", R"({"code": 4, "msg": "taken"})"}});
-        QString message;
-        QVERIFY(!HttpRequest::GetInstance()->checkPcName("a b", message));
-        QCOMPARE(message, QStringLiteral("taken"));
-        QCOMPARE(m_platform.record("http").last().value("raw_query").toString(), QStringLiteral("pc_name=a%20b"));
-    }
-
-    void ruleFailures_data()
-    {
-        QTest::addColumn<QString>("message");
-        QTest::addColumn<QString>("said");
-        QTest::newRow("broken inner text") << "[1," << QStringLiteral("域管服务配置失败，请重试");
-        QTest::newRow("no rule") << "{}" << QStringLiteral("服务端返回终端规则数据为空");
-    }
-    void ruleFailures()
-    {
-        QFETCH(QString, message);
+        QFETCH(int, status);
+        QFETCH(int, code);
+        QFETCH(bool, accepted);
         QFETCH(QString, said);
-        serveRuleMessage(message);
+        answer("config", 200, {{"code", 0}, {"message", rule(QString())}});
+        answer("pc/verify/name", status, {{"code", code}, {"msg", "said"}});
         QString text;
-        QVERIFY(!HttpRequest::GetInstance()->checkPcName("a", text));
+        QCOMPARE(m_client->checkPcName("a b", text), accepted);
         QCOMPARE(text, said);
-    }
-
-    void nameCheckNeedsStatus200()
-    {
-        m_platform.addFault({{"path", "/uim/v3/client/pc/verify/name"}},
-                            {{"status", 500}, {"body", R"({"code": 0, "msg": "fine"})"}});
-        QString message;
-        QVERIFY(!HttpRequest::GetInstance()->checkTerminalByServer("a", message));
-        QCOMPARE(message, QStringLiteral("域管服务配置失败，请重试"));
-        m_platform.clearFaults();
-        QVERIFY(HttpRequest::GetInstance()->checkTerminalByServer("good-name", message));
+        QCOMPARE(m_platform.record("http").last().value("raw_query").toString(), QStringLiteral("pc_name=a%20b"));
     }
 };
 
