@@ -1,16 +1,13 @@
 #include "notification.h"
-#include "paths.h"
 #include "platformcontrol.h"
-#include "testfiles.h"
+#include "testrows.h"
 
-#include <QtTest>
+#include <QRegularExpression>
 
 namespace
 {
 
 const QString kUser = QStringLiteral("a&b");
-const QString kListPath = QStringLiteral("/notification/v2/list");
-const QString kReadPath = QStringLiteral("/notification/v2/read");
 
 } // namespace
 
@@ -20,36 +17,22 @@ class TestNotification : public QObject
 
     PlatformControl m_platform;
     std::unique_ptr<QNotification> m_client;
+    int m_answers = 0;
+    bool m_ok = false;
+    NotifyMessageResponse m_response;
 
-    struct ListResult {
-        int calls = 0;
-        bool ok = false;
-        NotifyMessageResponse response;
-    };
-    struct ReadResult {
-        int calls = 0;
-        bool ok = false;
-    };
-
-    void list(ListResult& result)
+    /// Asks for the newest unread message and waits for the answer.
+    void list()
     {
-        m_client->getNotifyMessageList(kUser, true, 0, 1, [&result](bool ok, const NotifyMessageResponse& response) {
-            result = {result.calls + 1, ok, response};
+        m_client->getNotifyMessageList(kUser, true, 0, 1, [this](bool ok, const NotifyMessageResponse& response) {
+            ++m_answers;
+            m_ok = ok;
+            m_response = response;
         });
-    }
-    void setMessages(int count)
-    {
-        QJsonArray messages;
-        for (int i = 0; i < count; ++i)
-            messages.append(
-                QJsonObject{{"uuid", QString::number(i)},
-                            {"uid", kUser},
-                            {"send_uid", "admin"},
-                            {"title", QStringLiteral("%1 <b>%2</b>")},
-                            {"content", "c"},
-                            {"created_at", QStringLiteral("2026-11-24T08:%1:00Z").arg(i % 60, 2, 10, QChar('0'))},
-                            {"read_at", ""}});
-        m_platform.patchState({{"messages", messages}});
+        QTRY_COMPARE(m_answers, 1);
+        m_answers = 0;
+        QVERIFY(m_response.is_not_read);
+        QCOMPARE(m_client->pendingRequests(), 0);
     }
 
 private slots:
@@ -58,29 +41,25 @@ private slots:
         m_platform.clearFaults();
         m_platform.clearRecord();
         m_client = std::make_unique<QNotification>();
+        m_answers = 0;
     }
 
     void listRequest()
     {
-        setMessages(150);
-        ListResult result;
-        list(result);
-        QTRY_COMPARE(result.calls, 1);
-        QVERIFY(result.ok);
-        QCOMPARE(result.response.total, 150);
-        QCOMPARE(result.response.limit, 1);
-        QVERIFY(result.response.is_not_read);
-        QCOMPARE(result.response.messages.size(), 1);
-        QCOMPARE(result.response.messages.first().title, QStringLiteral("%1 <b>%2</b>"));
-        QCOMPARE(m_client->pendingRequests(), 0);
+        m_platform.setUnread(150, kUser);
+        list();
+        QVERIFY(m_ok);
+        QCOMPARE(m_response.total, 150);
+        QCOMPARE(m_response.limit, 1);
+        QCOMPARE(m_response.messages.size(), 1);
+        QCOMPARE(m_response.messages.first().title, QStringLiteral("<i>通知</i> 149 %2"));
 
         const QJsonObject request = m_platform.record("http").value(0);
         QCOMPARE(request.value("scheme").toString(), QStringLiteral("https"));
         const QString query = request.value("raw_query").toString();
-        QVERIFY2(QRegularExpression("^uid=a%26b&is_not_read=1&limit=1&offset=0&order=create_at&desc=1&timestaps=\\d+$")
-                     .match(query)
-                     .hasMatch(),
-                 qPrintable(query));
+        const QRegularExpression expected(
+            "^uid=a%26b&is_not_read=1&limit=1&offset=0&order=create_at&desc=1&timestaps=\\d+$");
+        QVERIFY2(expected.match(query).hasMatch(), qPrintable(query));
         const QJsonObject headers = request.value("headers").toObject();
         QCOMPARE(headers.value("x-lumo-version").toString(), QStringLiteral("v2"));
         QCOMPARE(headers.value("content-type").toString(), QStringLiteral("application/json"));
@@ -89,110 +68,51 @@ private slots:
 
     void readingTakesMessagesOff()
     {
-        setMessages(3);
-        ListResult before;
-        list(before);
-        QTRY_COMPARE(before.calls, 1);
-        ReadResult read;
-        const auto callback = [&read](bool ok, const QString&) { read = {read.calls + 1, ok}; };
-        m_client->readNotifyMessage(before.response.messages.value(0).uuid, callback);
-        QTRY_COMPARE(read.calls, 1);
-        QVERIFY(read.ok);
+        m_platform.setUnread(3, kUser);
+        int read = 0;
+        const auto callback = [&read](bool ok, const QString&) { read += ok ? 1 : 100; };
+        m_client->readNotifyMessage("2", callback);
+        QTRY_COMPARE(read, 1);
         const QJsonObject request = m_platform.record("http").last();
         QCOMPARE(request.value("method").toString(), QStringLiteral("PUT"));
-        QCOMPARE(request.value("path").toString(), kReadPath);
+        QCOMPARE(request.value("path").toString(), QStringLiteral("/notification/v2/read"));
         QCOMPARE(request.value("body").toString(), QStringLiteral("{\"uuid\":\"2\"}"));
         m_client->readAllNotifyMessage(kUser, callback);
-        QTRY_COMPARE(read.calls, 2);
-        ListResult after;
-        list(after);
-        QTRY_COMPARE(after.calls, 1);
-        QCOMPARE(after.response.total, 0);
+        QTRY_COMPARE(read, 2);
+        list();
+        QCOMPARE(m_response.total, 0);
     }
 
     void oddAnswers_data()
     {
-        QTest::addColumn<QJsonObject>("fault");
-        QTest::addColumn<bool>("ok");
-        QTest::addColumn<int>("total");
-        QTest::addColumn<int>("messages");
-        const QJsonObject count{{"X-Total-Count", "7"}};
-        QTest::newRow("count without messages")
-            << QJsonObject{{"status", 200}, {"body", ""}, {"headers", count}} << true << 7 << 0;
-        QTest::newRow("messages without count") << QJsonObject{{"status", 200}, {"body", "[{}, {}]"}} << true << 0 << 2;
-        QTest::newRow("object") << QJsonObject{{"status", 200}, {"body", "{}"}, {"headers", count}} << true << 7 << 0;
-        QTest::newRow("status 500") << QJsonObject{{"status", 500}, {"body", "[{}]"}, {"headers", count}} << false << 0
-                                    << 0;
-        QTest::newRow("status 201") << QJsonObject{{"status", 201}, {"body", "[{}]"}, {"headers", count}} << false << 0
-                                    << 0;
-        QTest::newRow("dropped") << QJsonObject{{"drop", "mid"}} << false << 0 << 0;
+        addColumns<QJsonObject, bool, int, int>("fault", "ok", "total", "messages");
+        const auto answer = [](int status, const char* body, const char* count = "7") {
+            return QJsonObject{{"status", status}, {"body", body}, {"headers", QJsonObject{{"X-Total-Count", count}}}};
+        };
+        addRow("count without messages", answer(200, ""), true, 7, 0);
+        addRow("count that is no number", answer(200, "[{}, {}]", "many"), true, 0, 2);
+        addRow("object", answer(200, "{}"), true, 7, 0);
+        addRow("status 500", answer(500, "[{}]"), false, 0, 0);
+        addRow("status 201", answer(201, "[{}]"), false, 0, 0);
+        addRow("refused", QJsonObject{{"drop", "before"}}, false, 0, 0);
+        addRow("cut off", QJsonObject{{"drop", "mid"}}, false, 0, 0);
     }
     void oddAnswers()
     {
         QFETCH(QJsonObject, fault);
-        QFETCH(bool, ok);
-        QFETCH(int, total);
-        QFETCH(int, messages);
-        m_platform.addFault({{"path", kListPath}}, fault);
-        ListResult result;
-        list(result);
-        QTRY_COMPARE(result.calls, 1);
-        QCOMPARE(result.ok, ok);
-        QCOMPARE(result.response.total, total);
-        QCOMPARE(result.response.messages.size(), messages);
-        QVERIFY(result.response.is_not_read);
-        QCOMPARE(m_client->pendingRequests(), 0);
+        m_platform.addFault({{"path", "/notification/v2/list"}}, fault);
+        list();
+        QTEST(m_ok, "ok");
+        QTEST(m_response.total, "total");
+        QTEST(m_response.messages.size(), "messages");
     }
 
     void certificatesOfAnotherAuthorityAreRefused()
     {
         m_platform.patchState({{"tls", QJsonObject{{"certificate", "other_ca"}}}});
-        ListResult result;
-        list(result);
-        QTRY_COMPARE(result.calls, 1);
-        QVERIFY(!result.ok);
+        list();
         m_platform.patchState({{"tls", QJsonObject{{"certificate", "server"}}}});
-    }
-
-    void aReplyAfterTheReceiverIsGone()
-    {
-        m_platform.addFault({{"path", kListPath}}, {{"delay_ms", 300}});
-        ListResult result;
-        list(result);
-        m_client.reset();
-        m_platform.clearFaults();
-        QCOMPARE(result.calls, 0);
-    }
-
-    void manyPollsAgainstFailuresLeaveNothing()
-    {
-        setMessages(2);
-        const QList<QJsonObject> faults{{},
-                                        {{"status", 500}},
-                                        {{"drop", "before"}},
-                                        {{"drop", "mid"}},
-                                        {{"status", 200}, {"body", "{"}},
-                                        {{"body_bytes", 100000}}};
-        int calls = 0;
-        for (int i = 0; i < 1000; ++i) {
-            if (i % 20 == 0) {
-                m_platform.clearFaults();
-                const QJsonObject fault = faults.at(i / 20 % faults.size());
-                if (!fault.isEmpty())
-                    m_platform.addFault({{"path", "/notification/v2/*"}}, fault);
-            }
-            NotifyMessageOption option;
-            // Unlike users make unlike URLs within one second.
-            option.uid = QString::number(i);
-            QEventLoop loop;
-            m_client->getNotifyMessageList(option, [&](bool, const NotifyMessageResponse&) {
-                ++calls;
-                loop.quit();
-            });
-            loop.exec();
-            QCOMPARE(calls, i + 1);
-        }
-        QCOMPARE(m_client->pendingRequests(), 0);
+        QVERIFY(!m_ok);
     }
 };
 
