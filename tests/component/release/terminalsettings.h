@@ -9,10 +9,6 @@ namespace terminalsettings
 
 inline const QString kControlCenter = QStringLiteral("com.vantor.oxa.control-center");
 inline const QString kLockDown = QStringLiteral("com.vantor.zent.lockdown");
-inline const QStringList kLockDownSwitches{"launcher-displayable",    "recycle-bin-displayable",
-                                           "shortcut-key-enable",     "resident-taskbar-app-displayable",
-                                           "usb-tray-icon-clickable", "taskbar-rightclick-menu-enable",
-                                           "web-tray-icon-clickable"};
 
 /// The output of a shell command; fails loudly.
 inline QString shell(const QString& command, const QStringList& arguments = {})
@@ -27,27 +23,26 @@ inline QString shell(const QString& command, const QStringList& arguments = {})
 /// Every key of the two schemas as "key value", sorted.
 inline QStringList all()
 {
-    QStringList lines =
-        shell("gsettings list-recursively " + kControlCenter + "; gsettings list-recursively " + kLockDown).split('\n');
-    for (QString& line : lines)
-        line = line.section(' ', 1);
-    lines.sort();
-    return lines;
+    const QString list = "gsettings list-recursively ";
+    return shell('(' + list + kControlCenter + ';' + list + kLockDown + ") | cut -d' ' -f2- | LC_ALL=C sort")
+        .split('\n');
 }
 
-inline QStringList lockDownSettings(const char* switches, const QStringList& others)
+/// All settings where the lock-down's switches have the one value and the other keys these lines.
+inline QStringList settings(const QString& switches, QStringList lines)
 {
-    QStringList lines = others;
-    for (const QString& name : kLockDownSwitches)
-        lines.append(name + ' ' + switches);
+    for (const char* name :
+         {"launcher-displayable", "recycle-bin-displayable", "shortcut-key-enable", "resident-taskbar-app-displayable",
+          "usb-tray-icon-clickable", "taskbar-rightclick-menu-enable", "web-tray-icon-clickable"})
+        lines.append(name + (' ' + switches));
     lines.sort();
     return lines;
 }
 
-inline const QStringList kManaged = lockDownSettings(
-    "false", {"auto-login-visable true", "nopasswd-login-visable true", "hide-module ['accounts', 'update']",
-              "control-center-shown ['display']", "control-center-hidden ['accounts']", "hotspot-enable 0"});
-inline const QStringList kReleased = lockDownSettings(
+inline const QStringList kManaged =
+    settings("false", {"auto-login-visable true", "nopasswd-login-visable true", "hide-module ['accounts', 'update']",
+                       "control-center-shown ['display']", "control-center-hidden ['accounts']", "hotspot-enable 0"});
+inline const QStringList kReleased = settings(
     "true", {"auto-login-visable false", "nopasswd-login-visable false", "hide-module @as []",
              "control-center-shown ['accounts', 'network']", "control-center-hidden ['']", "hotspot-enable 1"});
 
@@ -56,10 +51,10 @@ inline void manage()
 {
     QString commands;
     for (const QString& line : kManaged) {
-        const QString key = line.section(' ', 0, 0);
-        const bool isControlCenter = key.endsWith("-visable") || key == "hide-module";
-        commands += QStringLiteral("gsettings set %1 %2 \"%3\" && ")
-                        .arg(isControlCenter ? kControlCenter : kLockDown, key, line.section(' ', 1));
+        const bool isControlCenter = line.contains("-visable") || line.startsWith("hide-module");
+        commands +=
+            QStringLiteral("gsettings set %1 %2 \"%3\" && ")
+                .arg(isControlCenter ? kControlCenter : kLockDown, line.section(' ', 0, 0), line.section(' ', 1));
     }
     shell(commands + "true");
 }
