@@ -80,4 +80,4 @@ class ClientTest(unittest.TestCase):
         self.until("the panel to hide", lambda: not self.desktop.panel())
 
 
-__all__ = ["CLIENT", "ClientTest", "INFO_FILE", "SYSLOG", "read", "roomclient", "stop", "unittest", "write"]
+__all__ = ["CLIENT", "ClientTest", "INFO_FILE", "SYSLOG", "TREE", "read", "roomclient", "stop", "unittest", "write"]

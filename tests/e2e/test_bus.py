@@ -1,11 +1,12 @@
 """What the client offers on the session bus, and how a pushed message reaches the user."""
 
 import json
+import os
 import re
 import subprocess
 import xml.etree.ElementTree as ElementTree
 
-from clienttest import INFO_FILE, ClientTest, read, roomclient, unittest
+from clienttest import INFO_FILE, TREE, ClientTest, read, roomclient, unittest
 
 SERVICE = "com.vantor.tarn"
 NOTIFICATION = "/com/vantor/tarn/Notification"
@@ -44,18 +45,34 @@ class Bus(ClientTest):
     def notice(self):
         return self.window(NOTICE_SIZE)
 
-    def members(self, path, interface):
-        """What the object offers beside the bus's own interfaces, which must be this interface alone."""
-        node = ElementTree.fromstring(gdbus("introspect", "--session", "--xml", "-d", SERVICE, "-o", path).stdout)
-        own = [i for i in node.findall("interface") if not i.get("name").startswith("org.freedesktop.DBus.")]
+    def members(self, introspection, interface):
+        """What an object offers beside the bus's own interfaces, which must be this interface alone."""
+        own = [i for i in ElementTree.fromstring(introspection).findall("interface")
+               if not i.get("name").startswith("org.freedesktop.DBus.")]
         self.assertEqual([i.get("name") for i in own], [interface])
-        return {kind: sorted(m.get("name") for m in own[0].findall(kind)) for kind in ("method", "signal", "property")}
+        # A signal's arguments can only go out, whether that is written or not.
+        return sorted((m.tag, m.get("name"), [(a.get("type"), m.tag == "signal" or a.get("direction"))
+                                              for a in m.findall("arg")]) for m in own[0] if m.tag != "annotation")
 
-    def test_introspection_shows_the_interfaces_and_nothing_of_the_objects(self):
-        self.assertEqual(self.members(NOTIFICATION, "com.vantor.tarn.Notification"),
-                         {"method": ["AgencyNotify", "GioMount", "Notify"], "signal": ["onMessage"], "property": []})
-        self.assertEqual(self.members(FULLZONE, "com.vantor.tarn.Fullzone"),
-                         {"method": ["Notify"], "signal": ["confirmed", "hidewin"], "property": []})
+    def test_objects_offer_what_their_files_describe_and_nothing_else(self):
+        for path, name in {NOTIFICATION: "com.vantor.tarn.Notification", FULLZONE: "com.vantor.tarn.Fullzone"}.items():
+            live = gdbus("introspect", "--session", "--xml", "-d", SERVICE, "-o", path).stdout
+            described = self.members(read(os.path.join(TREE, "data", name + ".xml")), name)
+            self.assertEqual(self.members(live, name), described)
+
+    def test_pushed_message_is_announced_once(self):
+        with subprocess.Popen(["gdbus", "monitor", "--session", "-d", SERVICE, "-o", NOTIFICATION],
+                              stdout=subprocess.PIPE, text=True) as monitor:
+            self.addCleanup(monitor.kill)
+            while "is owned by" not in monitor.stdout.readline():
+                pass
+            push("lisi", "a <b>", "b %1", "c")
+            gdbus("call", "--session", "-d", SERVICE, "-o", NOTIFICATION, "-m",
+                  "com.vantor.tarn.Notification.AgencyNotify", "a", "b")
+            push("", "", "", "")
+            heard = [monitor.stdout.readline().partition("onMessage ")[2].strip() for _ in range(2)]
+            monitor.kill()
+        self.assertEqual(heard, ["(1, 'lisi', 'a <b>', 'b %1', 'c')", "(1, '', '', '', '')"])
 
     def test_integrity_dialog_follows_the_verification(self):
         def report(errmsg, url):
@@ -104,9 +121,13 @@ class Bus(ClientTest):
 
     def test_devices_are_unmounted_before_the_reply(self):
         subprocess.run(["mkdir", "-p", "/run/user/1000/gvfs/mtp:host=Foo_SER1"], check=True)
+        ended = os.path.join(roomclient.ROOM, "gio.ended")
+        roomclient.set_standin("gio", hook=f"sleep 0.3; : > {ended}")
+        self.addCleanup(roomclient.set_standin, "gio")
         reply = gdbus("call", "--session", "-d", SERVICE, "-o", NOTIFICATION, "-m",
                       "com.vantor.tarn.Notification.GioMount", "Foo", "Bar", "SER1", "1000")
         self.assertEqual(reply.returncode, 0)
+        self.assertTrue(os.path.exists(ended))
         self.assertEqual(roomclient.record("process", name="gio")[0]["args"],
                          ["mount", "-u", "/run/user/1000/gvfs/mtp:host=Foo_SER1"])
 
