@@ -13,25 +13,20 @@
 namespace
 {
 
-const QString portalService = QStringLiteral("org.freedesktop.portal.Desktop");
-const QString portalPath = QStringLiteral("/org/freedesktop/portal/desktop");
-const QString settingsInterface = QStringLiteral("org.freedesktop.portal.Settings");
-
+const QString portalPath = "/org/freedesktop/portal/desktop";
 /// Answers Read as the portal does, with the value in a variant in a variant.
 class Portal : public QDBusVirtualObject
 {
 public:
-    uint colorScheme = 1;
     int calls = 0;
 
     QString introspect(const QString&) const override { return {}; }
     bool handleMessage(const QDBusMessage& message, const QDBusConnection& connection) override
     {
         ++calls;
-        const bool asked = message.member() == QLatin1String("Read") &&
-                           message.arguments() == QVariantList{QStringLiteral("org.freedesktop.appearance"),
-                                                               QStringLiteral("color-scheme")};
-        const QVariant inner = QVariant::fromValue(QDBusVariant(colorScheme));
+        const bool asked = message.member() == "Read" &&
+                           message.arguments() == QVariantList{"org.freedesktop.appearance", "color-scheme"};
+        const QVariant inner = QVariant::fromValue(QDBusVariant(1U));
         return connection.send(asked ? message.createReply(QVariant::fromValue(QDBusVariant(inner)))
                                      : message.createErrorReply(QDBusError::UnknownMethod, QString()));
     }
@@ -44,45 +39,38 @@ class TestThemeHelper : public QObject
     Q_OBJECT
 
 private slots:
-    void followsThePortal();
-};
+    void followsThePortal()
+    {
+        QDBusConnection bus = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "portal");
+        Portal portal;
+        QVERIFY(bus.registerVirtualObject(portalPath, &portal));
+        QVERIFY(bus.registerService("org.freedesktop.portal.Desktop"));
 
-void TestThemeHelper::followsThePortal()
-{
-    QDBusConnection bus = QDBusConnection::connectToBus(QDBusConnection::SessionBus, QStringLiteral("portal"));
-    QVERIFY(bus.isConnected());
-    Portal portal;
-    QVERIFY(bus.registerVirtualObject(portalPath, &portal));
-    QVERIFY(bus.registerService(portalService));
+        QApplication::setPalette(ThemeHelper::palette(ThemeHelper::LightType));
+        ThemeHelper* helper = ThemeHelper::instance();
+        QCOMPARE(helper->themeType(), ThemeHelper::LightType); // the palette's, before the portal has answered
+        QSignalSpy changes(helper, &ThemeHelper::themeTypeChanged);
+        QTRY_COMPARE(helper->themeType(), ThemeHelper::DarkType);
+        QCOMPARE(portal.calls, 1);
 
-    QApplication::setPalette(ThemeHelper::palette(ThemeHelper::LightType));
-    ThemeHelper* helper = ThemeHelper::instance();
-    QCOMPARE(helper->themeType(), ThemeHelper::LightType); // the palette's, before the portal has answered
-    QSignalSpy changes(helper, &ThemeHelper::themeTypeChanged);
-    QTRY_COMPARE(helper->themeType(), ThemeHelper::DarkType);
-    QCOMPARE(portal.calls, 1);
-
-    struct Change {
-        QString nameSpace;
-        uint value;
-    };
-    const QString appearance = QStringLiteral("org.freedesktop.appearance");
-    // 0 is no preference and 77 no known value: the palette, which is light, decides then.
-    const QList<Change> steps = {{appearance, 2}, {appearance, 1},  {QStringLiteral("org.example.other"), 2},
-                                 {appearance, 0}, {appearance, 77}, {appearance, 1}};
-    for (const Change& step : steps) {
-        QDBusMessage signal =
-            QDBusMessage::createSignal(portalPath, settingsInterface, QStringLiteral("SettingChanged"));
-        signal << step.nameSpace << QStringLiteral("color-scheme") << QVariant::fromValue(QDBusVariant(step.value));
-        QVERIFY(bus.send(signal));
+        // 0 is no preference and 77 no known value: the palette, which is light, decides then.
+        const QString appearance = "org.freedesktop.appearance";
+        const QList<QPair<QString, uint>> steps = {{appearance, 2}, {appearance, 1},  {"org.example.other", 2},
+                                                   {appearance, 0}, {appearance, 77}, {appearance, 1}};
+        for (const auto& [nameSpace, value] : steps) {
+            QDBusMessage signal =
+                QDBusMessage::createSignal(portalPath, "org.freedesktop.portal.Settings", "SettingChanged");
+            signal << nameSpace << "color-scheme" << QVariant::fromValue(QDBusVariant(value));
+            QVERIFY(bus.send(signal));
+        }
+        QTRY_COMPARE(changes.count(), 5);
+        QList<int> seen;
+        for (const QList<QVariant>& arguments : changes)
+            seen.append(arguments.constFirst().toInt());
+        QCOMPARE(seen, QList<int>({2, 1, 2, 1, 2}));
+        QDBusConnection::disconnectFromBus("portal");
     }
-    QTRY_COMPARE(changes.count(), 5);
-    QList<int> seen;
-    for (const QList<QVariant>& arguments : changes)
-        seen.append(arguments.constFirst().toInt());
-    QCOMPARE(seen, QList<int>({2, 1, 2, 1, 2}));
-    QDBusConnection::disconnectFromBus(QStringLiteral("portal"));
-}
+};
 
 QTEST_MAIN(TestThemeHelper)
 #include "test_themehelper.moc"
