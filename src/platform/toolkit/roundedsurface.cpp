@@ -3,9 +3,36 @@
 #include "windowmanagerhelper.h"
 
 #include <QPainter>
+#include <QVector>
 #include <QWidget>
+#include <QX11Info>
+#include <QtMath>
 
 #include <cmath>
+
+// Last: its macros are words that Qt uses.
+#include <X11/Xlib.h>
+#include <X11/extensions/shape.h>
+
+namespace
+{
+
+/// Cuts an X window to its rounded shape, in the screen's own pixels: a widget's mask is as coarse as its scale.
+void cutX11(QWidget* window, int radius)
+{
+    const qreal ratio = window->devicePixelRatioF();
+    const QRect pixels(0, 0, qCeil(window->width() * ratio), qCeil(window->height() * ratio));
+    QVector<XRectangle> rectangles;
+    for (const QRect& part : roundedsurface::region(pixels, qRound(radius * ratio))) {
+        rectangles.append({static_cast<short>(part.x()), static_cast<short>(part.y()),
+                           static_cast<unsigned short>(part.width()), static_cast<unsigned short>(part.height())});
+    }
+    XShapeCombineRectangles(QX11Info::display(), window->winId(), ShapeBounding, 0, 0, rectangles.data(),
+                            rectangles.size(), ShapeSet, Unsorted);
+    XFlush(QX11Info::display());
+}
+
+} // namespace
 
 QRegion roundedsurface::region(const QRect& rect, int radius)
 {
@@ -24,10 +51,16 @@ QRegion roundedsurface::region(const QRect& rect, int radius)
 bool roundedsurface::applyShape(QWidget* window, int radius)
 {
     const bool composited = WindowManagerHelper::instance()->hasComposite();
-    if (composited)
+    if (QX11Info::isPlatformX11()) {
+        if (composited)
+            XShapeCombineMask(QX11Info::display(), window->winId(), ShapeBounding, 0, 0, 0L, ShapeSet);
+        else
+            cutX11(window, radius);
+    } else if (composited) {
         window->clearMask();
-    else
+    } else {
         window->setMask(region(window->rect(), radius));
+    }
     return composited;
 }
 

@@ -5,8 +5,8 @@
 #include "infowidget.h"
 #include "noticedialog.h"
 #include "notification.h"
+#include "toolkitmessagebox.h"
 
-#include <QMessageBox>
 #include <QPointer>
 #include <QPushButton>
 #include <QTimer>
@@ -34,9 +34,8 @@ QString noneUnreadText()
 void warnOfFailedRead(QWidget* parent, const QString& text)
 {
     // On the heap: the parent may go away while the box is open.
-    const QPointer<QMessageBox> box =
-        new QMessageBox(QMessageBox::Warning, QStringLiteral("消息调用警告"), text, QMessageBox::Ok, parent);
-    box->setTextFormat(Qt::PlainText);
+    const QPointer<ToolkitMessageBox> box =
+        new ToolkitMessageBox(QMessageBox::Warning, QStringLiteral("消息调用警告"), text, parent);
     box->exec();
     delete box;
 }

@@ -10,12 +10,12 @@
 #include "noconfig.h"
 #include "paths.h"
 #include "replies.h"
+#include "toolkitmessagebox.h"
 #include "urlquery.h"
 
 #include <QDebug>
 #include <QFile>
 #include <QJsonObject>
-#include <QMessageBox>
 #include <QNetworkAccessManager>
 #include <QNetworkReply>
 #include <QSignalBlocker>
@@ -41,10 +41,9 @@ void provokeOpenError(QFile& file)
 
 void showNoConfig(const QFile& file)
 {
-    QMessageBox box(QMessageBox::Critical, zent::noconfig::kTitle,
-                    zent::noconfig::text(file.fileName(), file.errorString()), QMessageBox::Ok);
-    box.setTextFormat(Qt::PlainText);
-    box.exec();
+    ToolkitMessageBox(QMessageBox::Critical, zent::noconfig::kTitle,
+                      zent::noconfig::text(file.fileName(), file.errorString()))
+        .exec();
 }
 
 } // namespace
