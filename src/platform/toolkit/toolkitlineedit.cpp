@@ -61,6 +61,10 @@ ToolkitLineEdit::ToolkitLineEdit(QWidget* parent) : QLineEdit(parent), m_bubbleT
     setPalette(colors);
     m_bubbleTimer->setSingleShot(true);
     connect(m_bubbleTimer, &QTimer::timeout, this, &ToolkitLineEdit::hideAlertMessage);
+    connect(this, &QLineEdit::textChanged, this, [this] {
+        if (m_bubble)
+            placeBubble();
+    });
 }
 
 ToolkitLineEdit::~ToolkitLineEdit()
@@ -117,6 +121,14 @@ void ToolkitLineEdit::placeBubble()
     const QPoint corner = mapTo(frame, QPoint(0, 0));
     const int room = qMax(60, frame->width() - corner.x() - bubbleGap);
     const int wanted = m_bubble->fontMetrics().size(0, m_bubble->text()).width() + 2 * bubblePadding + 2;
+    const int textEnd = textMargins().left() + fontMetrics().horizontalAdvance(displayText()) + bubblePadding;
+    const int signs = width() - qMax(textMargins().right(), bubbleGap);
+    if (wanted <= signs - textEnd && m_bubble->heightForWidth(wanted) <= height()) {
+        // Here it hides nothing, neither the next field nor a button.
+        m_bubble->resize(wanted, m_bubble->heightForWidth(wanted));
+        m_bubble->move(corner + QPoint(signs - wanted, (height() - m_bubble->height()) / 2));
+        return;
+    }
     const int width = qMin(wanted, qMin(room, qMax(this->width(), 60)));
     m_bubble->resize(width, m_bubble->heightForWidth(width));
     int top = corner.y() + height() + bubbleGap;

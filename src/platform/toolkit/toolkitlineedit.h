@@ -6,7 +6,7 @@
 class QTimer;
 class ToolkitLabel;
 
-/** A line edit with an alert state and, below it for a while, a message that says what is wrong. */
+/** A line edit with an alert state and, for a while, a message that says what is wrong. */
 class ToolkitLineEdit : public QLineEdit
 {
     Q_OBJECT
@@ -19,9 +19,9 @@ public:
     void setAlert(bool alert);
     bool isAlert() const { return m_alert; }
 
-    /// Shows @p message literally in a bubble under the field (above it where there is no room) for @p ms
-    /// milliseconds, or until hidden if @p ms is not positive. The bubble moves no other widget and takes neither
-    /// focus nor clicks. An empty message hides it.
+    /// Shows @p message literally in a bubble for @p ms milliseconds, or until hidden if @p ms is not positive. The
+    /// bubble lies in the field behind its text where it fits there, else under the field or above it. It moves no
+    /// other widget and takes neither focus nor clicks. An empty message hides it.
     void showAlertMessage(const QString& message, int ms = 3000);
     void hideAlertMessage();
 
