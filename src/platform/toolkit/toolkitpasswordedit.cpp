@@ -105,6 +105,8 @@ ToolkitPasswordEdit::ToolkitPasswordEdit(QWidget* parent)
     m_clearButton->setAccessibleName(QStringLiteral("清空"));
     m_clearButton->setFocusPolicy(Qt::NoFocus);
     m_clearButton->setCursor(Qt::ArrowCursor);
+    // The icon is drawn for light fields, and has to be seen on dark ones.
+    m_clearButton->setIconTinted(true);
     m_clearButton->resize(signSize, signSize);
     m_clearButton->hide();
     connect(m_clearButton, &QAbstractButton::clicked, this, &QLineEdit::clear);

@@ -5,6 +5,7 @@
 #include <QIcon>
 
 class QAbstractButton;
+class ToolkitToolButton;
 
 /**
  * A line edit for a password. A button inside it reveals the text until it is pressed again or the field disappears;
@@ -41,6 +42,6 @@ private:
 
     QAbstractButton* m_echoButton;
     QWidget* m_capsSign;
-    QAbstractButton* m_clearButton;
+    ToolkitToolButton* m_clearButton;
     bool m_echoButtonVisible = true;
 };

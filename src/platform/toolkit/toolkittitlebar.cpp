@@ -90,11 +90,7 @@ ToolkitTitlebar::ToolkitTitlebar(QWidget* parent)
 
 void ToolkitTitlebar::setIcon(const QIcon& icon)
 {
-    const QWindow* handle = window()->windowHandle();
-    const qreal ratio = handle ? handle->devicePixelRatio() : qApp->devicePixelRatio();
-    QPixmap pixmap = icon.pixmap(QSize(iconExtent, iconExtent) * ratio);
-    pixmap.setDevicePixelRatio(qMax<qreal>(1, pixmap.width() / qreal(iconExtent)));
-    m_icon->setPixmap(pixmap);
+    m_icon->setPixmap(icon.pixmap(window()->windowHandle(), QSize(iconExtent, iconExtent)));
     m_icon->setVisible(!icon.isNull());
 }
 

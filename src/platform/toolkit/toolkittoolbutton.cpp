@@ -1,7 +1,7 @@
 #include "toolkittoolbutton.h"
 
 #include <QPainter>
-#include <QStyleOptionToolButton>
+#include <QWindow>
 
 namespace
 {
@@ -22,6 +22,12 @@ ToolkitToolButton::ToolkitToolButton(QWidget* parent) : QToolButton(parent)
 void ToolkitToolButton::setTextAlignment(Qt::Alignment alignment)
 {
     m_alignment = alignment & Qt::AlignHorizontal_Mask;
+    update();
+}
+
+void ToolkitToolButton::setIconTinted(bool tinted)
+{
+    m_iconTinted = tinted;
     update();
 }
 
@@ -47,7 +53,19 @@ void ToolkitToolButton::paintEvent(QPaintEvent*)
         }
         QRect iconRect(QPoint(), iconSize());
         iconRect.moveCenter(rect().center());
-        icon().paint(&painter, iconRect, Qt::AlignCenter, isEnabled() ? QIcon::Normal : QIcon::Disabled);
+        const QIcon::Mode mode = isEnabled() ? QIcon::Normal : QIcon::Disabled;
+        if (m_iconTinted) {
+            QPixmap shape = icon().pixmap(window()->windowHandle(), iconSize(), mode);
+            QColor ink = palette().color(QPalette::Text);
+            ink.setAlpha(hovered || isDown() ? 230 : 170);
+            QPainter dye(&shape);
+            dye.setCompositionMode(QPainter::CompositionMode_SourceIn);
+            dye.fillRect(QRect(QPoint(), iconSize()), ink);
+            dye.end();
+            painter.drawPixmap(iconRect.topLeft(), shape);
+        } else {
+            icon().paint(&painter, iconRect, Qt::AlignCenter, mode);
+        }
     } else {
         QFont textFont = font();
         textFont.setUnderline(hovered);

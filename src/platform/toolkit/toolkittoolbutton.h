@@ -16,9 +16,13 @@ public:
     /// Where the text lies in the button: Qt::AlignLeft, Qt::AlignHCenter (at first) or Qt::AlignRight.
     void setTextAlignment(Qt::Alignment alignment);
 
+    /// Whether the icon is only a shape, drawn in the palette's text colour whatever its own (not so at first).
+    void setIconTinted(bool tinted);
+
 protected:
     void paintEvent(QPaintEvent* event) override;
 
 private:
     Qt::Alignment m_alignment = Qt::AlignHCenter;
+    bool m_iconTinted = false;
 };

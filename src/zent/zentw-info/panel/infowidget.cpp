@@ -182,6 +182,10 @@ QHBoxLayout* InfoWidget::createBottomRow(bool showRelease)
     onTop->setObjectName(QStringLiteral("onTop"));
     onTop->setFont(font);
     onTop->setFixedSize(80, 20);
+    // The style draws the box's frame a little darker than this, and so that one sees it.
+    QPalette boxPalette = palette();
+    boxPalette.setColor(QPalette::Window, QColor(0xa8, 0xa8, 0xaa));
+    onTop->setPalette(boxPalette);
     connect(onTop, &QCheckBox::stateChanged, this, &InfoWidget::onOntopStatechanged);
     row->addWidget(onTop, 0, Qt::AlignLeft);
 
