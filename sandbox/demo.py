@@ -8,67 +8,18 @@ display given by the environment, and stays until that window is closed.
 
 import argparse
 import os
-import subprocess
 import sys
 
 import roomclient
 from desktop import Desktop, stop
+from stage import (INTEGRITY_SIZE, LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE, RELEASE_LINK,
+                   RELEASE_SIZE, SPINNER_SIZE, Stage)
 
-# Where things lie in the panel, from its top left, and the links from its bottom left.
-LOGIN_BUTTON = (85, 145)
-NETWORK_BUTTON = (215, 145)
-RELEASE_LINK = (190, -32)
-PASSWORD_LINK = (262, -32)
 BACKGROUND = "#3d5a80"
-NOTICE_SIZE = (428, 450)
-RELEASE_SIZE = (400, 200)
-SPINNER_SIZE = (380, 160)
-PASSWORD_SIZE = (400, 280)
-INTEGRITY_SIZE = (380, 160)
-SERVICE = "com.vantor.tarn"
 
 
-class Demo:
+class Demo(Stage):
     """The scenes of the demo; each leaves its pictures and puts the desktop back."""
-
-    def __init__(self, desktop, directory):
-        self.desktop = desktop
-        self.directory = directory
-
-    def picture(self, name, window="root"):
-        """A picture of a window, or of the whole screen, once it has stopped changing."""
-        last = [None]
-
-        def unchanged():
-            content = self.desktop.run("sh", "-c", f"import -window {window} rgb:- | sha256sum")
-            same, last[0] = content == last[0], content
-            return same
-
-        self.desktop.wait("a steady picture", unchanged)
-        self.desktop.screenshot(os.path.join(self.directory, name + ".png"), window)
-
-    def dialog(self, size):
-        """Waits for the client's window of this size."""
-        return self.desktop.wait(f"the {size} window", lambda: next(
-            (window for window, (_, _, *wh) in self.desktop.windows() if tuple(wh) == size), None))
-
-    def gone(self, window):
-        self.desktop.wait("the window to close", lambda: not self.desktop.geometry(window))
-
-    def keys(self, window, *keys):
-        self.desktop.run("xdotool", "windowfocus", "--sync", window, "key", *keys)
-
-    def type(self, window, text):
-        self.desktop.run("xdotool", "windowfocus", "--sync", window, "type", text)
-
-    def click_in(self, window, x, y):
-        """Clicks at a point of a window; negative coordinates count from its right and bottom."""
-        left, top, width, height = self.desktop.geometry(window)
-        self.desktop.click(left + (x if x >= 0 else width + x), top + (y if y >= 0 else height + y))
-
-    def call(self, path, interface, method, *arguments):
-        subprocess.run(["gdbus", "call", "--session", "-d", SERVICE, "-o", path, "-m", f"{interface}.{method}",
-                        *arguments], check=True, capture_output=True)
 
     def panel(self):
         """The panel's two pages."""
@@ -79,7 +30,7 @@ class Demo:
         self.desktop.wait("the scene box", lambda: self.desktop.geometry(panel)[3] > 520)
         for name, button in (("login", LOGIN_BUTTON), ("network", NETWORK_BUTTON)):
             asked = len(roomclient.record("dbus", method="GetActiveConnectionInfo"))
-            self.click_in(panel, *button)
+            self.desktop.click_in(panel, *button)
             self.desktop.wait("the page", lambda: len(roomclient.record("dbus", method="GetActiveConnectionInfo")) > asked)
             self.desktop.run("xdotool", "mousemove", "400", "300")
             self.picture(f"panel-{name}", panel)
@@ -104,7 +55,7 @@ class Demo:
         self.picture("message-several", notice)
         for name, button in (("message-last", (-100, -30)), ("message-none", (214, -30))):
             listed = len(roomclient.record("http", path="/notification/v2/list"))
-            self.click_in(notice, *button)
+            self.desktop.click_in(notice, *button)
             self.desktop.wait("the refresh", lambda: len(roomclient.record("http", path="/notification/v2/list")) > listed)
             self.picture(name, notice)
         self.keys(notice, "Escape")
@@ -112,7 +63,7 @@ class Demo:
 
     def password(self):
         """A refused password change, then one that succeeds."""
-        self.click_in(self.desktop.panel(), *PASSWORD_LINK)
+        self.desktop.click_in(self.desktop.panel(), *PASSWORD_LINK)
         dialog = self.dialog(PASSWORD_SIZE)
         for old, name in (("wrong", "password-alert"), ("Zent@2026", None)):
             self.keys(dialog, "ctrl+a")
@@ -140,7 +91,7 @@ class Demo:
 
     def release(self):
         """A refused administrator password, then the release up to the reboot prompt."""
-        self.click_in(self.desktop.panel(), *RELEASE_LINK)
+        self.desktop.click_in(self.desktop.panel(), *RELEASE_LINK)
         dialog = self.dialog(RELEASE_SIZE)
         self.type(dialog, "wrong")
         self.picture("release-password", dialog)

@@ -11,13 +11,20 @@ import roomclient
 HERE = os.path.dirname(os.path.abspath(__file__))
 CLIENT_CLASS = "zentw-info"
 PANEL_WIDTH = 300
+PORTAL = "org.freedesktop.portal.Desktop"
+SCHEMES = {"none": 0, "dark": 1, "light": 2}
+# The settings of the tray host and of the notification service that are lengths.
+TINT2_SIZES = "panel_size|panel_padding|systray_padding|systray_icon_size|time1_font|clock_padding"
+DUNST_SIZES = "width|offset|font|corner_radius|padding|horizontal_padding"
 
 
 class Desktop:
     """Starts and stops the parts of a desktop; a context manager, which ends whatever is still running."""
 
-    def __init__(self, size="1280x800", server="Xvfb"):
-        self.size = size
+    def __init__(self, size="1280x800", server="Xvfb", scale=1):
+        """A desktop of this size, as a client sees it that draws at this scale."""
+        self.scale = scale
+        self.size = "x".join(str(round(int(extent) * scale)) for extent in size.split("x"))
         self.server = server
         self.env = dict(os.environ)
         self.processes = []
@@ -79,14 +86,39 @@ class Desktop:
         os.remove(ready)
 
     def start_tray(self):
-        process = self.spawn(["tint2", "-c", os.path.join(HERE, "tint2rc")])
+        process = self.spawn(["tint2", "-c", self._configuration("tint2rc", TINT2_SIZES)])
         self.wait("the tray", lambda: self.windows("tint2"))
         return process
 
     def start_notifications(self):
         """The desktop's notification service; dunstctl speaks to it."""
-        self.spawn(["dunst", "-conf", os.path.join(HERE, "dunstrc")])
+        self.spawn(["dunst", "-conf", self._configuration("dunstrc", DUNST_SIZES)])
         self.wait("the notification service", lambda: self.run("dunstctl", "count"))
+
+    def _configuration(self, name, sizes):
+        """A configuration file of the desktop; the numbers of the settings named are drawn at its scale."""
+        with open(os.path.join(HERE, name), encoding="utf-8") as stream:
+            lines = stream.readlines()
+        path = os.path.join(os.environ["ROOM"], name + self.env["DISPLAY"])
+        with open(path, "w", encoding="utf-8") as stream:
+            for line in lines:
+                key, equals, value = line.partition("=")
+                if re.fullmatch(rf"\s*({sizes})\s*", key):
+                    value = re.sub(r"\d+(?![\d%])", lambda number: str(round(int(number[0]) * self.scale)), value)
+                stream.write(key + equals + value)
+        return path
+
+    def start_portal(self, scheme="none"):
+        """The desktop portal, which says that the desktop's colours are "light" or "dark", or "none" of both."""
+        self.spawn([sys.executable, "-B", os.path.join(HERE, "portal.py"), str(SCHEMES[scheme])])
+        self.wait("the portal", lambda: "true" in self.run(
+            "gdbus", "call", "--session", "-d", "org.freedesktop.DBus", "-o", "/org/freedesktop/DBus",
+            "-m", "org.freedesktop.DBus.NameHasOwner", PORTAL))
+
+    def set_colour_scheme(self, scheme):
+        """Changes the setting of the portal that start_portal() started."""
+        self.run("gdbus", "call", "--session", "-d", PORTAL, "-o", "/org/freedesktop/portal/desktop",
+                 "-m", "com.vantor.sandbox.Portal.SetColorScheme", str(SCHEMES[scheme]))
 
     def set_background(self, colour):
         self.run("xsetroot", "-solid", colour)
@@ -98,8 +130,9 @@ class Desktop:
 
     def start_client(self, program, **env):
         """Starts the client; its standard error is kept in /run/room/client.err."""
+        scaling = {"QT_SCALE_FACTOR": str(self.scale)} if self.scale != 1 else {}
         with open(os.path.join(os.environ["ROOM"], "client.err"), "ab") as errors:
-            return self.spawn([program], stderr=errors, env=env)
+            return self.spawn([program], stderr=errors, env={**scaling, **env})
 
     def windows(self, instance=CLIENT_CLASS):
         """The visible windows of a program by its instance name, as (id, (x, y, width, height))."""
@@ -121,12 +154,13 @@ class Desktop:
 
     def icon(self):
         """The client's icon in an XEmbed tray, or None."""
-        return next((window for window, (_, _, width, height) in self.windows() if 4 < width <= 64 and 4 < height <= 64),
-                    None)
+        return next((window for window, (_, _, *size) in self.windows()
+                     if all(4 < extent <= 64 * self.scale for extent in size)), None)
 
     def panel(self):
         """The client's panel while it is on the screen, or None."""
-        return next((window for window, (_, _, width, _) in self.windows() if width == PANEL_WIDTH), None)
+        return next((window for window, (_, _, width, _) in self.windows() if width == PANEL_WIDTH * self.scale),
+                    None)
 
     def click(self, x, y, button=1, repeat=1):
         self.run("xdotool", "mousemove", str(x), str(y), "click", "--repeat", str(repeat), str(button))
@@ -140,8 +174,13 @@ class Desktop:
 
     def click_panel(self, x, y):
         """Clicks at a point of the panel."""
-        left, top, _, _ = self.geometry(self.panel())
-        self.click(left + x, top + y)
+        self.click_in(self.panel(), x, y)
+
+    def click_in(self, window, x, y):
+        """Clicks at a point of a window, in its own pixels; negative coordinates count from its right and bottom."""
+        left, top, width, height = self.geometry(window)
+        x, y = round(x * self.scale), round(y * self.scale)
+        self.click(left + (x if x >= 0 else width + x), top + (y if y >= 0 else height + y))
 
     def screenshot(self, path, window="root"):
         subprocess.run(["import", "-window", window, path], env=self.env, check=True)

@@ -30,13 +30,14 @@ class ClientTest(unittest.TestCase):
     """Each test has a fresh log, record and desktop; the platform and the terminal's files are put back."""
 
     tray = True
+    scale = 1
 
     def setUp(self):
         self.saved = {path: read(path) for path in (INFO_FILE, "/usr/share/zent/machine.txt")}
         write(SYSLOG, b"")
         roomclient.clear_record()
         roomclient.clear_faults()
-        self.desktop = Desktop()
+        self.desktop = Desktop(scale=self.scale)
         self.addCleanup(self._end)
         self.desktop.__enter__()
         self.desktop.start_window_manager()

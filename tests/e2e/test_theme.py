@@ -1,0 +1,84 @@
+"""Light and dark: windows that follow the desktop, those that do not, and texts that stand out in both."""
+
+import os
+import sys
+import tempfile
+
+from PIL import Image
+
+from clienttest import CLIENT, ClientTest, roomclient, unittest
+
+import contrast
+from gallery import Gallery
+from stage import PASSWORD_LINK, PASSWORD_SIZE, RELEASE_LINK, RELEASE_SIZE, Stage
+
+LIGHT, DARK = (0xfa, 0xfa, 0xfb), (0x25, 0x27, 0x2a)
+# A point of each window where nothing but its surface is.
+SURFACE = (150, 12)
+
+
+class Live(ClientTest):
+    def setUp(self):
+        super().setUp()
+        self.stage = Stage(self.desktop, tempfile.mkdtemp())
+
+    def surface(self, window):
+        """The colour of a window's surface on the screen."""
+        path = os.path.join(self.stage.directory, "window.png")
+        self.desktop.screenshot(path, window)
+        with Image.open(path) as image:
+            return image.convert("RGB").getpixel(SURFACE)
+
+    def await_surface(self, window, colour):
+        self.until(f"the surface {colour}", lambda: self.surface(window) == colour)
+
+    def test_open_dialogs_follow_and_the_panel_stays_light(self):
+        self.desktop.start_portal("dark")
+        panel = self.start_shown()
+        for link, size in ((PASSWORD_LINK, PASSWORD_SIZE), (RELEASE_LINK, RELEASE_SIZE)):
+            with self.subTest(size):
+                self.desktop.set_colour_scheme("dark")
+                self.desktop.click_in(panel, *link)
+                dialog = self.stage.dialog(size)
+                self.await_surface(dialog, DARK)
+                for scheme, colour in (("light", LIGHT), ("dark", DARK), ("none", LIGHT)):
+                    self.desktop.set_colour_scheme(scheme)
+                    self.await_surface(dialog, colour)
+                    self.assertEqual(self.surface(panel), LIGHT)
+                self.stage.keys(dialog, "Escape")
+                self.stage.gone(dialog)
+
+    def test_portal_that_comes_later(self):
+        panel = self.start_shown()
+        self.desktop.click_in(panel, *PASSWORD_LINK)
+        dialog = self.stage.dialog(PASSWORD_SIZE)
+        self.await_surface(dialog, LIGHT)
+        self.desktop.start_portal("none")
+        self.desktop.set_colour_scheme("dark")
+        self.await_surface(dialog, DARK)
+
+
+class Contrast(ClientTest):
+    """Every window of the client, at the scale at which strokes are wide enough to measure."""
+
+    scale = 2
+
+    def check(self, theme):
+        self.addCleanup(roomclient.patch_state, roomclient.state())
+        self.desktop.start_notifications()
+        self.desktop.start_portal(theme)
+        gallery = Gallery(self.desktop, os.path.join(tempfile.mkdtemp(), theme), CLIENT, theme)
+        os.makedirs(gallery.directory)
+        pictures = gallery.all()
+        self.assertEqual({contrast.Picture(path).window for path in pictures} - {"tray"}, set(contrast.WINDOWS))
+        self.assertEqual([verdict._asdict() for verdict in contrast.failures(pictures)], [])
+
+    def test_light(self):
+        self.check("light")
+
+    def test_dark(self):
+        self.check("dark")
+
+
+if __name__ == "__main__":
+    sys.exit(unittest.main())
