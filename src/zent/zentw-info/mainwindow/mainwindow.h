@@ -1,6 +1,7 @@
 #pragma once
 
 #include "toolkitblurframe.h"
+#include "trayclicks.h"
 
 #include <QList>
 #include <QPair>
@@ -198,6 +199,7 @@ private:
     closeGuarddialog* guardDialog = nullptr;
     NetworkDaemonProxy* networkProxy = nullptr;
     QSystemTrayIcon* sysTrayIcon = nullptr;
+    TrayClicks trayClicks;
     int infoPage = 0;
 
     QString clientName;

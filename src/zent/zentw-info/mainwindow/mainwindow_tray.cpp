@@ -28,7 +28,9 @@ void MainWindow::showSystemTrayIcon()
     else
         connect(ThemeHelper::instance(), &ThemeHelper::themeTypeChanged, this, &MainWindow::setSysThemetype);
     sysTrayIcon->setToolTip(tr("终端域管平台"));
-    connect(sysTrayIcon, &QSystemTrayIcon::activated, this, &MainWindow::onActivatedSysTrayIcon);
+    connect(sysTrayIcon, &QSystemTrayIcon::activated, this, [this](QSystemTrayIcon::ActivationReason reason) {
+        trayClicks.pass(*sysTrayIcon, reason, [this](auto meant) { onActivatedSysTrayIcon(meant); });
+    });
     qDebug() << "showSystemTrayIcon"
              << "sysTrayIcon->show()";
     sysTrayIcon->show();

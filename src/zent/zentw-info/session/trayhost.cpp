@@ -4,15 +4,17 @@
 
 #include <KSelectionWatcher>
 #include <QDBusConnection>
+#include <QDBusError>
 #include <QDBusMessage>
 #include <QDBusPendingCallWatcher>
-#include <QDBusPendingReply>
 #include <QDBusReply>
 #include <QDBusServiceWatcher>
 #include <QDBusVariant>
 #include <QDebug>
 #include <QGuiApplication>
 #include <QX11Info>
+
+#include <limits>
 
 namespace
 {
@@ -21,6 +23,7 @@ using zent::dbus::kTrayWatcherPath;
 using zent::dbus::kTrayWatcherService;
 
 constexpr int kAskTimeoutMs = 500;
+constexpr int kNoTimeout = std::numeric_limits<int>::max();
 
 QDBusMessage hostRegisteredQuestion()
 {
@@ -47,10 +50,18 @@ bool xembedHostPresent()
     return hasDisplay() && KSelectionWatcher(traySelection().constData()).owner() != XCB_WINDOW_NONE;
 }
 
-bool notifierHostPresent(const QDBusConnection& bus)
+/// Whether the registry says that a host has registered; false also for an error.
+bool saysHosted(const QDBusMessage& reply)
 {
-    const QDBusReply<QDBusVariant> reply = bus.call(hostRegisteredQuestion(), QDBus::Block, kAskTimeoutMs);
-    return reply.isValid() && reply.value().variant().toBool();
+    const QDBusReply<QDBusVariant> hosted = reply;
+    return hosted.isValid() && hosted.value().variant().toBool();
+}
+
+/// Whether a registry is on the bus and keeps silent.
+bool isSilence(const QDBusMessage& reply)
+{
+    const QDBusError::ErrorType error = QDBusError(reply).type();
+    return error == QDBusError::NoReply || error == QDBusError::Timeout || error == QDBusError::TimedOut;
 }
 
 } // namespace
@@ -58,15 +69,19 @@ bool notifierHostPresent(const QDBusConnection& bus)
 bool zent::trayhost::canShowIconNow()
 {
     const QDBusConnection bus = QDBusConnection::sessionBus();
-    if (!hasDisplay() && !bus.isConnected())
-        return true;
-    return xembedHostPresent() || (bus.isConnected() && notifierHostPresent(bus));
+    if (!bus.isConnected())
+        return !hasDisplay() || xembedHostPresent();
+    // The registry is asked even where a tray of the X display is there: Qt asks it too before its first icon, and
+    // waits for the answer as long as the bus allows.
+    const QDBusMessage reply = bus.call(hostRegisteredQuestion(), QDBus::Block, kAskTimeoutMs);
+    return !isSilence(reply) && (saysHosted(reply) || xembedHostPresent());
 }
 
 TrayHostWatch::TrayHostWatch(QObject* parent) : QObject(parent)
 {
     watchDisplay();
     watchBus();
+    QMetaObject::invokeMethod(this, &TrayHostWatch::look, Qt::QueuedConnection);
 }
 
 void TrayHostWatch::watchDisplay()
@@ -74,9 +89,7 @@ void TrayHostWatch::watchDisplay()
     if (!hasDisplay())
         return;
     auto* watcher = new KSelectionWatcher(traySelection().constData(), -1, this);
-    connect(watcher, &KSelectionWatcher::newOwner, this, &TrayHostWatch::announce);
-    if (watcher->owner() != XCB_WINDOW_NONE)
-        QMetaObject::invokeMethod(this, &TrayHostWatch::announce, Qt::QueuedConnection);
+    connect(watcher, &KSelectionWatcher::newOwner, this, &TrayHostWatch::look);
 }
 
 void TrayHostWatch::watchBus()
@@ -89,21 +102,26 @@ void TrayHostWatch::watchBus()
     }
     // The registry's name alone does not make a host: it may be there long before one has registered.
     auto* registry = new QDBusServiceWatcher(kTrayWatcherService, bus, QDBusServiceWatcher::WatchForRegistration, this);
-    connect(registry, &QDBusServiceWatcher::serviceRegistered, this, &TrayHostWatch::askBus);
+    connect(registry, &QDBusServiceWatcher::serviceRegistered, this, &TrayHostWatch::look);
     bus.connect(kTrayWatcherService, kTrayWatcherPath, kTrayWatcherService,
-                QStringLiteral("StatusNotifierHostRegistered"), this, SLOT(askBus()));
-    askBus();
+                QStringLiteral("StatusNotifierHostRegistered"), this, SLOT(look()));
 }
 
-void TrayHostWatch::askBus()
+void TrayHostWatch::look()
 {
     if (m_announced)
         return;
-    auto* call = new QDBusPendingCallWatcher(QDBusConnection::sessionBus().asyncCall(hostRegisteredQuestion()), this);
+    const QDBusConnection bus = QDBusConnection::sessionBus();
+    if (!bus.isConnected()) {
+        if (xembedHostPresent())
+            announce();
+        return;
+    }
+    // However long a busy registry takes: only once it has answered, or left the bus, is Qt's own question to it safe.
+    auto* call = new QDBusPendingCallWatcher(bus.asyncCall(hostRegisteredQuestion(), kNoTimeout), this);
     connect(call, &QDBusPendingCallWatcher::finished, this, [this, call] {
         call->deleteLater();
-        const QDBusPendingReply<QDBusVariant> reply = *call;
-        if (reply.isValid() && reply.value().variant().toBool())
+        if (saysHosted(call->reply()) || xembedHostPresent())
             announce();
     });
 }

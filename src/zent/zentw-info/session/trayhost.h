@@ -5,14 +5,15 @@
 namespace zent::trayhost
 {
 
-/// Whether a tray icon made now would be shown: a host is there, or there is neither an X display nor a session bus
-/// on which one could appear later. Asks the session bus and waits up to half a second. Calls no tray function of Qt.
+/// Whether a tray icon made now would be shown at once: a host is there, or there is neither an X display nor a session
+/// bus on which one could appear later. Asks the session bus and waits up to half a second; a registry that is silent
+/// for so long makes it false, whatever else is there. Calls no tray function of Qt.
 bool canShowIconNow();
 
 } // namespace zent::trayhost
 
 /// Waits for the first tray host of the session, of either protocol, without touching a tray function of Qt: Qt
-/// decides on its first such call, once for the whole process, whether a host exists.
+/// decides on its first such call, once for the whole process, whether a host exists. Never blocks, and sets no timer.
 class TrayHostWatch : public QObject
 {
     Q_OBJECT
@@ -26,7 +27,7 @@ signals:
     void hostAppeared();
 
 private slots:
-    void askBus();
+    void look();
 
 private:
     void watchBus();
