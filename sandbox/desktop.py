@@ -1,7 +1,8 @@
-"""A small desktop inside a room: an X server, a window manager, a panel with a tray, and the client on it."""
+"""A small desktop inside a room: an X server, a window manager, panels with a tray, and the client on it."""
 
 import os
 import re
+import shutil
 import signal
 import subprocess
 import sys
@@ -86,9 +87,24 @@ class Desktop:
         os.remove(ready)
 
     def start_tray(self):
+        """A panel whose tray is of the X display (XEmbed)."""
         process = self.spawn(["tint2", "-c", self._configuration("tint2rc", TINT2_SIZES)])
         self.wait("the tray", lambda: self.windows("tint2"))
         return process
+
+    def start_notifier_tray(self):
+        """A panel whose tray is of the session bus (StatusNotifierItem); it may be the only such one."""
+        # The panel writes its own settings back.
+        settings = shutil.copy(os.path.join(HERE, "lxqt-panel.conf"), os.environ["ROOM"])
+        process = self.spawn(["lxqt-panel", "-c", settings])
+        self.wait("the tray", lambda: "true" in self.registry("IsStatusNotifierHostRegistered"))
+        return process
+
+    def registry(self, name):
+        """A property of the StatusNotifier registry, as gdbus writes it; empty while there is none."""
+        return self.run("gdbus", "call", "--session", "-d", "org.kde.StatusNotifierWatcher", "-o",
+                        "/StatusNotifierWatcher", "-m", "org.freedesktop.DBus.Properties.Get",
+                        "org.kde.StatusNotifierWatcher", name)
 
     def start_notifications(self):
         """The desktop's notification service; dunstctl speaks to it."""
@@ -153,9 +169,18 @@ class Desktop:
         return tuple(int(match.group(1)) for match in found)
 
     def icon(self):
-        """The client's icon in an XEmbed tray, or None."""
-        return next((window for window, (_, _, *size) in self.windows()
-                     if all(4 < extent <= 64 * self.scale for extent in size)), None)
+        """Where the client's icon is, as (x, y, width, height); None while no tray shows it."""
+        def fits(box):
+            return all(4 < side <= 64 * self.scale for side in box[2:])
+        return next((box for _, box in self.windows() if fits(box)), None) or \
+            next((box for box in map(self._content, self.windows("lxqt-panel")) if fits(box)), None)
+
+    def _content(self, panel):
+        """The place of what differs from the background of a panel that shows nothing but its tray."""
+        window, (left, top, _, _) = panel
+        text = self.run("convert", "x:" + window, "-trim", "-format", "%X %Y %w %h", "info:")
+        x, y, width, height = map(int, text.split() or "0000")
+        return left + x, top + y, width, height
 
     def panel(self):
         """The client's panel while it is on the screen, or None."""
@@ -167,7 +192,7 @@ class Desktop:
 
     def click_icon(self, button=1, repeat=1):
         """Clicks on the tray icon, each time at another corner of it, so that no two calls make a double click."""
-        x, y, width, height = self.geometry(self.wait("the tray icon", self.icon))
+        x, y, width, height = self.wait("the tray icon", self.icon)
         self._corner = 1 - self._corner
         part = 1 + 2 * self._corner
         self.click(x + width * part // 4, y + height * part // 4, button, repeat)

@@ -1,7 +1,5 @@
 """The tray icon and the panel on a real X server with a real tray host and window manager."""
 
-import re
-
 from clienttest import ClientTest, roomclient, unittest
 
 SCREEN = (1280, 800)
@@ -44,14 +42,6 @@ class Tray(ClientTest):
         self.desktop.click_icon()
         self.desktop.wait("the panel", self.desktop.panel)
 
-    def test_host_that_restarts(self):
-        self.start()
-        tint2 = self.desktop.processes[2]
-        tint2.terminate()
-        tint2.wait(5)
-        self.desktop.start_tray()
-        self.desktop.wait("the icon in the new tray", self.desktop.icon)
-
 
 class Panel(ClientTest):
     def test_place_and_frame(self):
@@ -88,23 +78,6 @@ class Panel(ClientTest):
         self.desktop.click_panel(width - 24, 24)
         self.wait_hidden()
         self.assertIsNone(self.client.poll())
-
-
-class LateTray(ClientTest):
-    tray = False
-
-    def test_host_that_comes_after_the_client(self):
-        self.start()
-        self.assertFalse(any("showSystemTrayIcon" in line for line in roomclient.syslog_lines()))
-        self.desktop.start_tray()
-        self.desktop.wait("the tray icon", self.desktop.icon, 2)
-        self.assertIsNone(self.client.poll())
-
-    def test_without_any_host_the_client_lives(self):
-        self.start()
-        roomclient.wait_record(lambda entry: entry.get("path") == "/api/client/area/scenes", 15)
-        self.assertIsNone(self.client.poll())
-        self.assertTrue(re.search(r"resetUIPos", "\n".join(self.messages())))
 
 
 if __name__ == "__main__":

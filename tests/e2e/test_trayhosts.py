@@ -1,0 +1,160 @@
+"""When the tray icon appears on desktops of either tray protocol, and what clicks on it do where Qt does not see them.
+
+    test_trayhosts.py ROOM CLIENT
+
+Opens three rooms side by side, so that what must wait for a minute does so in no more: a room has one client.
+"""
+
+import os
+import signal
+import subprocess
+import sys
+
+if __name__ == "__main__" and "ROOM" not in os.environ:
+    enter, client = sys.argv[1:]
+    command = [enter, "--platform", "--env", "CLIENT=" + client, "/usr/bin/python3", "-B", __file__, "-v"]
+    rooms = [subprocess.Popen(command + cases) for cases in (["LateXembed"], ["LateNotifier"],
+                                                             ["Xembed", "Notifier", "Registry"])]
+    sys.exit(max([room.wait() for room in rooms]))
+
+from clienttest import CLIENT, ClientTest, roomclient, unittest  # noqa: E402
+
+ICON_SECONDS = 1
+# Of the client's main thread in a minute without a tray. The questions to the server make some 25; a timer that looked
+# for the tray every second would add 60.
+MOST_WAKE_UPS = 70
+REGISTRY = os.path.join(os.path.dirname(os.path.abspath(__file__)), "registry.py")
+
+
+def gdbus(service, path, method, *arguments):
+    """The answer of a method on the session bus; empty when there is none within a second."""
+    result = subprocess.run(["gdbus", "call", "--session", "--timeout", "1", "-d", service, "-o", path, "-m", method,
+                             *arguments], capture_output=True, text=True, check=False)
+    return result.stdout
+
+
+class HostTest(ClientTest):
+    tray = False
+
+    def wait_icon(self, seconds=ICON_SECONDS):
+        return self.until("the icon", self.desktop.icon, seconds)
+
+    def lives(self, seconds=0):
+        """The client runs on for so long, without an icon, and its objects answer."""
+        with self.assertRaises(subprocess.TimeoutExpired):
+            self.client.wait(seconds)
+        self.assertFalse(any("showSystemTrayIcon" in line for line in roomclient.syslog_lines()))
+        self.assertEqual(gdbus("com.vantor.tarn", "/com/vantor/tarn/Notification",
+                               "com.vantor.tarn.Notification.Notify", "1", "lisi", "a", "b", "c"), "()\n")
+        roomclient.wait_syslog("message for another user not shown")
+
+    def wake_ups(self):
+        with open(f"/proc/{self.client.pid}/status", encoding="ascii") as stream:
+            return int(next(line for line in stream if line.startswith("voluntary")).split()[1])
+
+    def count(self, text):
+        return sum(text in line for line in roomclient.syslog_lines())
+
+
+class XembedHost(HostTest):
+    def start_host(self):
+        return self.desktop.start_tray()
+
+
+class NotifierHost(HostTest):
+    def start_host(self):
+        return self.desktop.start_notifier_tray()
+
+    def has_item(self):
+        return f"StatusNotifierItem-{self.client.pid}-1" in self.desktop.registry("RegisteredStatusNotifierItems")
+
+
+class Soon:
+    def test_host_that_starts_beside_the_client_and_restarts(self):
+        self.client = self.desktop.start_client(CLIENT)
+        host = self.start_host()
+        roomclient.wait_syslog("renewCurrentScene")
+        self.wait_icon()
+        for number in (signal.SIGTERM, signal.SIGKILL):
+            with self.subTest(number):
+                host.send_signal(number)
+                host.wait(5)
+                self.until("the icon to go with its host", lambda: not self.desktop.icon())
+                host = self.start_host()
+                self.wait_icon()
+        self.assertIsNone(self.client.poll())
+
+    def test_host_after_five_seconds(self):
+        self.start()
+        self.lives(5)
+        self.start_host()
+        self.wait_icon()
+
+
+class Late:
+    def test_host_after_a_minute(self):
+        self.start()
+        before = self.wake_ups()
+        self.lives(60)
+        self.assertLess(self.wake_ups() - before, MOST_WAKE_UPS)
+        self.start_host()
+        self.wait_icon()
+
+
+class Xembed(Soon, XembedHost):
+    pass
+
+
+class LateXembed(Late, XembedHost):
+    pass
+
+
+class LateNotifier(Late, NotifierHost):
+    pass
+
+
+class Notifier(Soon, NotifierHost):
+    def test_clicks(self):
+        self.start_host()
+        self.start()
+        item = f"org.kde.StatusNotifierItem-{self.client.pid}-1"
+        for name, times, reason, toggles in (("left", {}, 3, 1), ("middle", {"button": 2}, 4, 1),
+                                             ("double", {"repeat": 2}, 2, 2)):
+            with self.subTest(name):
+                self.desktop.click_icon(**times)
+                roomclient.wait_syslog(f"reason : {reason}")
+                self.assertEqual(self.count("winstatus"), toggles)
+        self.desktop.wait("the panel", self.desktop.panel)
+        # This host keeps right clicks to itself; others hand them on.
+        gdbus(item, "/StatusNotifierItem", "org.kde.StatusNotifierItem.ContextMenu", "0", "0")
+        roomclient.wait_syslog("reason : 1")
+        gdbus(item, "/StatusNotifierItem", "org.kde.StatusNotifierItem.Activate", "0", "0")
+        self.until("the click", lambda: self.count("winstatus") == 3)
+        self.assertIsNotNone(self.desktop.panel())
+
+
+class Registry(NotifierHost):
+    def test_before_its_host(self):
+        self.start()
+        self.desktop.spawn(["/usr/bin/python3", "-B", REGISTRY])
+        self.until("the registry", lambda: "false" in self.desktop.registry("IsStatusNotifierHostRegistered"))
+        self.lives()
+        gdbus("org.kde.StatusNotifierWatcher", "/StatusNotifierWatcher",
+              "org.kde.StatusNotifierWatcher.RegisterStatusNotifierHost", "org.kde.StatusNotifierHost-1")
+        self.until("the item", self.has_item, ICON_SECONDS)
+
+    def test_silence_holds_up_nothing(self):
+        host = self.start_host()
+        self.desktop.start_tray()
+        host.send_signal(signal.SIGSTOP)
+        try:
+            self.start()
+            self.lives()
+        finally:
+            host.send_signal(signal.SIGCONT)
+        self.wait_icon(5)
+        self.assertTrue(self.has_item())
+
+
+if __name__ == "__main__":
+    unittest.main()
