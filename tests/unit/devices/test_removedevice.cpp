@@ -87,7 +87,9 @@ private slots:
             LogCapture log;
             RemoveDevice(nullptr).removeDevice("", "", "", uid);
             QCOMPARE(unmounted(), QStringList());
+            // Only what is a user id may become part of a path.
             QCOMPARE(log.lines().value(0), QString("removeDevice ------------i"));
+            QCOMPARE(log.count("not a user id"), uid == "4000000000" ? 0 : 1);
             QCOMPARE(log.lines().size(), 2);
         }
     }
