@@ -149,6 +149,15 @@ private slots:
                                                      "server_port", "terminal_name"}));
         QCOMPARE(m_store->getTerminalAlias(nullptr), QString("新终端"));
     }
+
+    void machineIdIsTrimmed()
+    {
+        testfiles::write(zent::kMachineidPath, " 4f1d-22 \n");
+        QCOMPARE(m_store->getMachineID(nullptr, false), QString("4f1d-22"));
+        testfiles::remove(zent::kMachineidPath);
+        bool ok = true;
+        QVERIFY(m_store->getMachineID(&ok, false).isEmpty() && !ok);
+    }
 };
 
 QTEST_GUILESS_MAIN(TestFileContent)

@@ -39,6 +39,8 @@ class TestRemoveDevice : public QObject
     }
 
 private slots:
+    void initTestCase() { QVERIFY2(qEnvironmentVariableIsSet("ROOM"), "runs inside a room only"); }
+
     void init()
     {
         processrecord::clear();

@@ -64,6 +64,8 @@ class TestLockdown : public QObject
     }
 
 private slots:
+    void initTestCase() { QVERIFY2(qEnvironmentVariableIsSet("ROOM"), "runs inside a room only"); }
+
     void everySetterChangesItsKeysOnly()
     {
         // Seen at once: neither an event loop nor the end of the object comes between.

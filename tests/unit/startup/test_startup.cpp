@@ -15,6 +15,8 @@ class TestStartup : public QObject
     const QString m_room = qEnvironmentVariable("ROOM");
 
 private slots:
+    void initTestCase() { QVERIFY2(qEnvironmentVariableIsSet("ROOM"), "runs inside a room only"); }
+
     void domainGate()
     {
         const QMap<QByteArray, bool> cases = {{R"({"is_Domain": true})", true},
