@@ -63,6 +63,7 @@ def default_state():
         "zentg": {"result": 0},
         "tls": {"certificate": "server", "demand_client_certificate": False},
         "listening": True,
+        "black_hole": False,
         "services": {"network": True, "iam": True, "zentg": True, "login1": True},
     }
 

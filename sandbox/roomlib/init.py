@@ -56,6 +56,7 @@ class Init:
         self.control = control
         self.env = environment(options)
         self.command = None
+        self.firewall = None
         self.log = os.open(f"{ROOM}/room.log", os.O_WRONLY | os.O_CREAT | os.O_APPEND, 0o644)
 
     def run(self):
@@ -87,9 +88,18 @@ class Init:
         socket.sethostname(terminal.HOST_NAME)
         with open("/proc/sys/net/ipv4/ip_unprivileged_port_start", "w", encoding="ascii") as stream:
             stream.write("0")
+        if self.options.platform:
+            self._start_firewall()
         linux.unshare(linux.CLONE_NEWUSER)
         linux.map_ids(self.options.uid, 0, self.options.uid, 0)
         linux.drop_capabilities()
+
+    def _start_firewall(self):
+        """Leaves a shell behind that keeps the rights over the room's network: it hands each line to nft."""
+        self.firewall, served = socket.socketpair()
+        with served:
+            spawn(["sh", "-c", 'while read -r rules; do nft "$rules"; echo $?; done'], self.env,
+                  {0: served.fileno(), 1: served.fileno(), 2: self.log})
 
     @staticmethod
     def _bind_syslog():
@@ -126,7 +136,9 @@ class Init:
     def _start_platform(self):
         log = os.open(f"{ROOM}/platform.log", os.O_WRONLY | os.O_CREAT | os.O_APPEND, 0o644)
         reader, writer = os.pipe()
-        spawn([f"{self.options.tree}/sandbox/platform", "--ready-fd", "3"], self.env, {1: log, 2: log, 3: writer})
+        spawn([f"{self.options.tree}/sandbox/platform", "--firewall-fd", "0", "--ready-fd", "3"], self.env,
+              {0: self.firewall.fileno(), 1: log, 2: log, 3: writer})
+        self.firewall.close()
         os.close(writer)
         os.close(log)
         if not self._wait_ready(reader):
