@@ -1,5 +1,8 @@
 #include "httpclientapi.h"
 
+#include "curloptions.h"
+#include "hostguard.h"
+
 #include <QDateTime>
 #include <QDebug>
 #include <QFile>
@@ -10,37 +13,28 @@
 
 #include <algorithm>
 #include <array>
+#include <cerrno>
 #include <climits>
 #include <csignal>
 #include <ctime>
+#include <map>
 
 namespace
 {
 
-constexpr long kConnectTimeoutMs = 1500;
-constexpr curl_off_t kMaxReplyBytes = 16 * 1024 * 1024;
+using zent::http::HeaderList;
+using zent::http::kMaxReplyBytes;
+using zent::http::OptionSetter;
+using zent::http::Request;
+using zent::http::SslConfig;
+
+/// A failure without a connection that took this long has cost the caller as much as a time-out.
+constexpr curl_off_t kLongWaitUs = 1'000'000;
 
 struct EasyDeleter {
     void operator()(CURL* handle) const { curl_easy_cleanup(handle); }
 };
 using EasyHandle = std::unique_ptr<CURL, EasyDeleter>;
-
-struct ListDeleter {
-    void operator()(curl_slist* list) const { curl_slist_free_all(list); }
-};
-using HeaderList = std::unique_ptr<curl_slist, ListDeleter>;
-
-struct Request {
-    QByteArray method;
-    QByteArray url;
-    QByteArray body;
-};
-
-struct SslConfig {
-    QString ca;
-    QString cert;
-    QString key;
-};
 
 /// Keeps SIGPIPE from the calling thread: CURLOPT_NOSIGNAL leaves it to the caller, and a TLS library may write to a
 /// connection that the server has closed.
@@ -69,25 +63,6 @@ private:
     sigset_t m_sigpipe{};
     sigset_t m_previous{};
     bool m_wasPending = false;
-};
-
-/// Sets options of a handle and remembers the first failure, so that a request never leaves with a check missing.
-class OptionSetter
-{
-public:
-    explicit OptionSetter(CURL* handle) : m_handle(handle) {}
-
-    template <typename Value>
-    void set(CURLoption option, Value value)
-    {
-        if (m_result == CURLE_OK)
-            m_result = curl_easy_setopt(m_handle, option, value);
-    }
-    CURLcode result() const { return m_result; }
-
-private:
-    CURL* m_handle;
-    CURLcode m_result = CURLE_OK;
 };
 
 /// A reply as it comes in.
@@ -141,83 +116,37 @@ QString logUrl(const QString& url)
     return parsed.toString(QUrl::RemoveQuery | QUrl::RemoveFragment | QUrl::RemoveUserInfo);
 }
 
-/// The URL in the form curl takes; empty when it is no absolute one.
-QByteArray encodeUrl(const QString& url)
+/// The URL without port 0, which stands for the default port; empty when it is no absolute one.
+QUrl absoluteUrl(const QString& url)
 {
     QUrl parsed(url);
     if (!parsed.isValid() || parsed.host().isEmpty())
         return {};
     if (parsed.port() == 0)
         parsed.setPort(-1);
-    return parsed.toEncoded(QUrl::RemoveFragment);
+    return parsed;
 }
 
-bool appendHeader(HeaderList& list, const char* header)
+/// What the request that has just ended says about its host.
+HostGuard::Outcome outcomeOf(CURL* handle, CURLcode result)
 {
-    curl_slist* extended = curl_slist_append(list.get(), header);
-    if (extended == nullptr)
-        return false;
-    static_cast<void>(list.release());
-    list.reset(extended);
-    return true;
-}
-
-/// The header lines that differ from curl's own; null when memory is short. A name without a value keeps it away.
-HeaderList makeHeaders(const Request& request)
-{
-    HeaderList list;
-    const char* contentType = request.body.isEmpty() ? "Content-Type:" : "Content-Type: application/json";
-    if (!appendHeader(list, contentType) || !appendHeader(list, "Expect:"))
-        return nullptr;
-    return list;
-}
-
-void setLimits(OptionSetter& options, long timeoutMs)
-{
-    options.set(CURLOPT_TIMEOUT_MS, timeoutMs);
-    options.set(CURLOPT_CONNECTTIMEOUT_MS, std::min(timeoutMs, kConnectTimeoutMs));
-    options.set(CURLOPT_NOSIGNAL, 1L);
-    // Without it a handle waits for its resolver thread, however long the name server stays silent.
-    options.set(CURLOPT_QUICK_EXIT, 1L);
-    options.set(CURLOPT_MAXFILESIZE_LARGE, kMaxReplyBytes);
-}
-
-/// Keeps everything away that the environment or a reply could bring in.
-void setConfinement(OptionSetter& options)
-{
-    options.set(CURLOPT_PROTOCOLS_STR, "http,https");
-    options.set(CURLOPT_HTTP_VERSION, static_cast<long>(CURL_HTTP_VERSION_1_1));
-    options.set(CURLOPT_FOLLOWLOCATION, 0L);
-    options.set(CURLOPT_PROXY, "");
-    options.set(CURLOPT_NETRC, static_cast<long>(CURL_NETRC_IGNORED));
-}
-
-void setTls(OptionSetter& options, const SslConfig& ssl)
-{
-    const auto pathOrNull = [](const QByteArray& path) { return path.isEmpty() ? nullptr : path.constData(); };
-    options.set(CURLOPT_SSLVERSION, static_cast<long>(CURL_SSLVERSION_TLSv1_2));
-    options.set(CURLOPT_SSL_VERIFYPEER, 1L);
-    options.set(CURLOPT_SSL_VERIFYHOST, 2L);
-    // Both default to the system's authorities.
-    options.set(CURLOPT_CAPATH, static_cast<const char*>(nullptr));
-    options.set(CURLOPT_CAINFO, pathOrNull(QFile::encodeName(ssl.ca)));
-    options.set(CURLOPT_SSLCERT, pathOrNull(QFile::encodeName(ssl.cert)));
-    options.set(CURLOPT_SSLKEY, pathOrNull(QFile::encodeName(ssl.key)));
-    // An encrypted key fails; without a pass phrase it would be asked for on the terminal.
-    options.set(CURLOPT_KEYPASSWD, "");
-}
-
-void setMessage(OptionSetter& options, const Request& request, const curl_slist* headers)
-{
-    options.set(CURLOPT_URL, request.url.constData());
-    options.set(CURLOPT_HTTPHEADER, headers);
-    if (request.method == "POST" || !request.body.isEmpty()) {
-        options.set(CURLOPT_POSTFIELDS, request.body.constData());
-        options.set(CURLOPT_POSTFIELDSIZE_LARGE, static_cast<curl_off_t>(request.body.size()));
-        options.set(CURLOPT_CUSTOMREQUEST, request.method.constData());
-    } else {
-        options.set(CURLOPT_HTTPGET, 1L);
-    }
+    if (result == CURLE_OK)
+        return HostGuard::Outcome::Answered;
+    curl_off_t connectedUs = 0;
+    curl_off_t readyUs = 0;
+    curl_off_t totalUs = 0;
+    long error = 0;
+    curl_easy_getinfo(handle, CURLINFO_CONNECT_TIME_T, &connectedUs);
+    curl_easy_getinfo(handle, CURLINFO_PRETRANSFER_TIME_T, &readyUs);
+    curl_easy_getinfo(handle, CURLINFO_TOTAL_TIME_T, &totalUs);
+    curl_easy_getinfo(handle, CURLINFO_OS_ERRNO, &error);
+    // A kept connection has no time of connecting, one that waits for the TLS handshake none of readiness.
+    if (connectedUs > 0 || readyUs > 0)
+        return result == CURLE_OPERATION_TIMEDOUT ? HostGuard::Outcome::ReplyTimedOut : HostGuard::Outcome::Met;
+    // The resolver may give a silent name server up before the request's own time is over.
+    if (result == CURLE_OPERATION_TIMEDOUT || totalUs >= kLongWaitUs)
+        return HostGuard::Outcome::ConnectTimedOut;
+    return error == ECONNREFUSED ? HostGuard::Outcome::Met : HostGuard::Outcome::Unknown;
 }
 
 } // namespace
@@ -238,6 +167,7 @@ public:
     int send(QString& reply, const QByteArray& method, const QString& url, const QString& body);
 
 private:
+    HostGuard& guardOf(const QUrl& url);
     CURLcode perform(const Request& request, QByteArray& reply, long& status);
     CURLcode prepare(const Request& request, const curl_slist* headers, ReplyBuffer& buffer);
     QString sslFingerprint() const;
@@ -245,20 +175,31 @@ private:
     void dropConnections();
 
     EasyHandle m_handle;
+    std::map<QString, std::unique_ptr<HostGuard>> m_guards;
     SslConfig m_ssl;
     QString m_fingerprint;
     long m_timeoutMs = 2000;
     std::array<char, CURL_ERROR_SIZE> m_error{};
+    HostGuard::Outcome m_outcome = HostGuard::Outcome::Unknown;
 };
 
 int HttpClientApi::Session::send(QString& reply, const QByteArray& method, const QString& url, const QString& body)
 {
+    const QUrl absolute = absoluteUrl(url);
+    HostGuard& guard = guardOf(absolute);
+    const QString objection = method == "GET" ? guard.objection() : QString();
+    if (!objection.isEmpty()) {
+        reply.clear();
+        qWarning() << method.constData() << logUrl(url) << "not sent:" << qPrintable(objection);
+        return -guard.failure();
+    }
     const SigpipeBlocker blocker;
-    const Request request{method, encodeUrl(url), body.toUtf8()};
     QByteArray data;
     long status = 0;
     m_error[0] = '\0';
-    const CURLcode result = perform(request, data, status);
+    m_outcome = HostGuard::Outcome::Unknown;
+    const CURLcode result = perform({method, absolute.toEncoded(QUrl::RemoveFragment), body.toUtf8()}, data, status);
+    guard.note(m_outcome, result);
     if (result != CURLE_OK) {
         reply.clear();
         qWarning() << method.constData() << logUrl(url)
@@ -267,6 +208,15 @@ int HttpClientApi::Session::send(QString& reply, const QByteArray& method, const
     }
     reply = QString::fromUtf8(data);
     return static_cast<int>(status);
+}
+
+HostGuard& HttpClientApi::Session::guardOf(const QUrl& url)
+{
+    const int port = url.port(url.scheme() == QLatin1String("https") ? 443 : 80);
+    std::unique_ptr<HostGuard>& guard = m_guards[url.host() + QLatin1Char(':') + QString::number(port)];
+    if (!guard)
+        guard = std::make_unique<HostGuard>(url.host(), static_cast<quint16>(port));
+    return *guard;
 }
 
 CURLcode HttpClientApi::Session::perform(const Request& request, QByteArray& reply, long& status)
@@ -281,8 +231,10 @@ CURLcode HttpClientApi::Session::perform(const Request& request, QByteArray& rep
 
     ReplyBuffer buffer;
     CURLcode result = prepare(request, headers.get(), buffer);
-    if (result == CURLE_OK)
+    if (result == CURLE_OK) {
         result = curl_easy_perform(m_handle.get());
+        m_outcome = outcomeOf(m_handle.get(), result);
+    }
     if (result == CURLE_OK)
         result = curl_easy_getinfo(m_handle.get(), CURLINFO_RESPONSE_CODE, &status);
     // For curl a reply that ends in its head is a complete one with an empty body.

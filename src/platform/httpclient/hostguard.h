@@ -1,0 +1,65 @@
+#pragma once
+
+#include <QDeadlineTimer>
+#include <QHostInfo>
+#include <QObject>
+#include <QTimer>
+
+#include <chrono>
+#include <vector>
+
+class QTcpSocket;
+
+/// Decides whether polls are sent to one host, so that a host that lets requests time out costs few time-outs.
+///
+/// Reachable: polls are sent. Unreachable, after a connect time-out: none is sent until a connection attempt, made
+/// without blocking after 2 s, 4 s and so on up to every 30 s, meets an answer, be it a refusal. HeldBack, after a
+/// reply time-out: none is sent for a period that doubles from 2 s to 60 s with every time-out, until a request is
+/// answered. The attempts need the event loop of the object's thread; while the host is reachable no timer runs.
+class HostGuard : public QObject
+{
+    Q_OBJECT
+
+public:
+    enum class State { Reachable, Unreachable, HeldBack };
+
+    /// What a request that was sent tells about its host.
+    enum class Outcome {
+        Answered,        ///< a complete reply
+        Met,             ///< a connection or a refusal, but no reply
+        ConnectTimedOut, ///< no connection within its time
+        ReplyTimedOut,   ///< a connection, but no reply within its time
+        Unknown          ///< failed for a reason of this side, and without delay
+    };
+
+    HostGuard(const QString& host, quint16 port, QObject* parent = nullptr);
+    ~HostGuard() override;
+
+    State state() const { return m_state; }
+    /// Why a poll must not be sent now, for the log; empty when it may be.
+    QString objection() const;
+    /// The result of the request that brought the host into its state.
+    int failure() const { return m_failure; }
+    /// Takes in how a request ended; `result` is what failure() is to return from now on.
+    void note(Outcome outcome, int result);
+
+private:
+    QString name() const;
+    void answersAgain();
+    void startTry();
+    void connectTo(const QHostInfo& addresses);
+    void endTry();
+    void stopTrying();
+
+    QString m_host;
+    quint16 m_port;
+    State m_state = State::Reachable;
+    int m_failure = 0;
+    std::chrono::milliseconds m_holdPeriod{0};
+    QDeadlineTimer m_heldUntil;
+    std::chrono::milliseconds m_tryInterval{0};
+    QTimer m_nextTry;
+    QTimer m_tryLimit;
+    int m_lookup = -1;
+    std::vector<QTcpSocket*> m_sockets;
+};
