@@ -2,6 +2,7 @@
 
 #include <QDBusAbstractInterface>
 #include <QDBusConnection>
+#include <QDeadlineTimer>
 #include <QString>
 
 #include <optional>
@@ -16,6 +17,10 @@ public:
                        QObject* parent = nullptr);
 
     /// The daemon's active connections as its JSON text. Waits for the answer, for as long as the bus allows, without
-    /// letting events through. Nothing on a bus error.
+    /// letting events through. Nothing on a bus error, which is logged, and nothing without asking for 60 s after a
+    /// daemon that hangs has used that time up.
     std::optional<QString> activeConnectionInfo();
+
+private:
+    QDeadlineTimer m_pause;
 };

@@ -1,6 +1,8 @@
+#include "dbusnames.h"
 #include "fileconfig.h"
 #include "httprequest.h"
 #include "logcapture.h"
+#include "networkdaemonproxy.h"
 #include "paths.h"
 #include "platformcontrol.h"
 #include "testfiles.h"
@@ -110,6 +112,26 @@ private slots:
         LogCapture log;
         QCOMPARE(FileConfig::GetInstance()->getMacAddress(), QString());
         QVERIFY(log.contains("GetActiveConnectionInfo error"));
+    }
+
+    void hangingNetworkDaemonCostsOneTimeOut()
+    {
+        NetworkDaemonProxy daemon(zent::dbus::kNetworkService, zent::dbus::kNetworkPath, QDBusConnection::sessionBus());
+        daemon.setTimeout(1500);
+        LogCapture log;
+        const auto askTwice = [&] {
+            m_platform.clearRecord();
+            QVERIFY(!daemon.activeConnectionInfo() && !daemon.activeConnectionInfo());
+        };
+        // A failure that comes at once does not keep it from being asked.
+        m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}}, {{"error", "com.vantor.Error.Failed"}});
+        askTwice();
+        QCOMPARE(m_platform.record("dbus").size(), 2);
+        QCOMPARE(log.count("GetActiveConnectionInfo failed: com.vantor.Error.Failed"), 2);
+        m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}}, {{"hang", true}});
+        askTwice();
+        QCOMPARE(m_platform.record("dbus").size(), 1);
+        QCOMPARE(log.count("not asked again for 60 s"), 1);
     }
 
     void failedRequestStillSignals()
