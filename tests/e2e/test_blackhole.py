@@ -56,7 +56,7 @@ class Blackhole(ClientTest):
 
     def icon_places(self):
         """Two places on the icon, so far from each other that two clicks are no double click."""
-        x, y, width, height = self.desktop.geometry(self.desktop.icon())
+        x, y, width, height = self.desktop.icon()
         return [(x + width * part // 4, y + height * part // 4) for part in (1, 3)]
 
     def settle(self, place):
