@@ -59,6 +59,15 @@ class Outside(unittest.TestCase):
         self.assertEqual(result.returncode, 0, result.stdout + result.stderr)
         self.assertEqual([place for place in places if os.path.exists(place)], [])
 
+    def test_writable_directories_are_put_back(self):
+        places = ("/usr/bin", "/usr/share/doc", "/var/lib/dpkg")
+        before = [os.listdir(place) for place in places]
+        options = [word for place in places for word in ("--writable", place)]
+        result = enter(*options, "bash", "-ec", f"for d in {' '.join(places)}; do echo x > $d/made; done; "
+                       "rm /usr/bin/env /var/lib/dpkg/status; ! echo x > /usr/made")
+        self.assertEqual(result.returncode, 0, result.stdout + result.stderr)
+        self.assertEqual([os.listdir(place) for place in places], before)
+
     def test_exit_status_and_signals_pass(self):
         cases = (("exit 0", 0), ("exit 7", 7), ("kill -9 $$", 128 + signal.SIGKILL), ("kill -15 $$", 143))
         for script, status in cases:
