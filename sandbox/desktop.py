@@ -86,9 +86,11 @@ class Desktop:
         self.wait("the window manager", lambda: os.path.exists(ready))
         os.remove(ready)
 
-    def start_tray(self):
-        """A panel whose tray is of the X display (XEmbed)."""
-        process = self.spawn(["tint2", "-c", self._configuration("tint2rc", TINT2_SIZES)])
+    def start_tray(self, edge="bottom"):
+        """A panel along that edge of the screen, whose tray is of the X display (XEmbed)."""
+        place = {"left": "center left vertical", "right": "center right vertical"}.get(edge, f"{edge} center horizontal")
+        configuration = self._configuration("tint2rc", TINT2_SIZES, {"panel_position": place})
+        process = self.spawn(["tint2", "-c", configuration])
         self.wait("the tray", lambda: self.windows("tint2"))
         return process
 
@@ -111,7 +113,7 @@ class Desktop:
         self.spawn(["dunst", "-conf", self._configuration("dunstrc", DUNST_SIZES)])
         self.wait("the notification service", lambda: self.run("dunstctl", "count"))
 
-    def _configuration(self, name, sizes):
+    def _configuration(self, name, sizes, changes=None):
         """A configuration file of the desktop; the numbers of the settings named are drawn at its scale."""
         with open(os.path.join(HERE, name), encoding="utf-8") as stream:
             lines = stream.readlines()
@@ -119,6 +121,8 @@ class Desktop:
         with open(path, "w", encoding="utf-8") as stream:
             for line in lines:
                 key, equals, value = line.partition("=")
+                if key.strip() in (changes or {}):
+                    value = f" {changes[key.strip()]}\n"
                 if re.fullmatch(rf"\s*({sizes})\s*", key):
                     value = re.sub(r"\d+(?![\d%])", lambda number: str(round(int(number[0]) * self.scale)), value)
                 stream.write(key + equals + value)

@@ -80,5 +80,28 @@ class Panel(ClientTest):
         self.assertIsNone(self.client.poll())
 
 
+class LateTray(ClientTest):
+    tray = False
+
+    def test_panel_keeps_clear_of_a_desktop_panel_that_comes_later(self):
+        for edge, place in (("left", (SCREEN[0] - 36, SCREEN[1])), ("top", (SCREEN[0], SCREEN[1] - 36))):
+            with self.subTest(edge):
+                self.start()
+                self.until("the placing", lambda: any("resetUIPos" in line for line in self.messages()))
+                host = self.desktop.start_tray(edge)
+                self.desktop.click_icon(button=3)
+                self.desktop.click_icon()
+                panel = self.desktop.wait("the panel", self.desktop.panel)
+
+                def corner(window=panel):
+                    x, y, width, height = self.desktop.geometry(window)
+                    return x + width, y + height
+
+                self.until("the place in the corner", lambda wanted=place: corner() == wanted)
+                for process in (self.client, host):
+                    process.terminate()
+                    process.wait(5)
+
+
 if __name__ == "__main__":
     unittest.main()

@@ -77,6 +77,7 @@ MainWindow::MainWindow(QWidget* parent, int osVersion)
     posTimer = std::make_unique<QTimer>();
     connect(posTimer.get(), &QTimer::timeout, this, &MainWindow::resetUIPos);
     posTimer->start(kPlacementIntervalMs);
+    zent::screens::watch(this, [this] { returnToScreen(); });
     if (!WindowManagerHelper::instance()->hasBlurWindow())
         setMaskAlpha(kOpaque);
 }
@@ -145,6 +146,17 @@ void MainWindow::fitToPanel()
     setFixedHeight(height);
     if (!movedByUser)
         zent::screens::placeBottomRight(*this, zent::screens::availableGeometry());
+}
+
+void MainWindow::returnToScreen()
+{
+    const QList<QRect> screens = zent::screens::all();
+    if (!zent::screens::showWhole(screens, noticeDialog->frameGeometry()))
+        zent::screens::placeCentre(*noticeDialog);
+    if (movedByUser && zent::screens::showWhole(screens, frameGeometry()))
+        return;
+    movedByUser = false;
+    zent::screens::placeBottomRight(*this, zent::screens::availableGeometry());
 }
 
 void MainWindow::createNoticeDialog()

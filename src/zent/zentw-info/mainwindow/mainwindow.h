@@ -180,6 +180,11 @@ private:
     void offerScenes(const QStringList& names);
     /// Follows a change of the panel's height; the window keeps its corner unless the user has moved it.
     void fitToPanel();
+    /// Puts the panel into its corner again after the screens have changed, unless the user has moved it to a place
+    /// that is still on a screen.
+    void returnToScreen();
+    /// What the tray icon and the panel are called.
+    static QString productName() { return tr("终端域管平台"); }
 
     QList<QString> commandOutput;
     QNetworkAccessManager* userManager = nullptr;
