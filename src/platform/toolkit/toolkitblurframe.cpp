@@ -2,14 +2,32 @@
 
 #include "roundedsurface.h"
 #include "themehelper.h"
+#include "windowkeys.h"
 #include "windowmanagerhelper.h"
 
 #include <KWindowEffects>
+#include <QAccessibleWidget>
+#include <QKeyEvent>
 #include <QWindow>
+
+namespace
+{
+
+/// Makes a frame that is a window one to assistive programs too, which would take it for a mere container.
+QAccessibleInterface* windowInterface(const QString& className, QObject* object)
+{
+    auto* widget = qobject_cast<ToolkitBlurFrame*>(object);
+    if (!widget || !widget->isWindow() || className != QLatin1String(ToolkitBlurFrame::staticMetaObject.className()))
+        return nullptr;
+    return new QAccessibleWidget(widget, QAccessible::Window);
+}
+
+} // namespace
 
 ToolkitBlurFrame::ToolkitBlurFrame(QWidget* parent)
     : QWidget(parent), m_maskColor(ThemeHelper::palette(ThemeHelper::LightType).color(QPalette::Window))
 {
+    QAccessible::installFactory(windowInterface);
     // A parent here means "belongs to", not "lies in", once the caller makes this a window; both must look right.
     if (!parent)
         setWindowFlags(windowFlags() | Qt::FramelessWindowHint);
@@ -47,6 +65,12 @@ bool ToolkitBlurFrame::event(QEvent* event)
     if (event->type() == QEvent::Show || (event->type() == QEvent::WinIdChange && isVisible()))
         updateShape();
     return handled;
+}
+
+void ToolkitBlurFrame::keyPressEvent(QKeyEvent* event)
+{
+    if (!isWindow() || !windowkeys::handle(this, event))
+        QWidget::keyPressEvent(event);
 }
 
 void ToolkitBlurFrame::resizeEvent(QResizeEvent* event)

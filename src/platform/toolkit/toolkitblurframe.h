@@ -7,8 +7,8 @@
  * A rounded, frameless surface that lets a blurred desktop shine through where the window manager can do that.
  *
  * As a window it is translucent with smooth corners under a compositing manager, and opaque and cut to shape without
- * one. As a child it is a rounded panel. Its children get a palette that suits the mask colour, whatever the
- * desktop's theme.
+ * one; Esc closes it, and Return presses the button that has the focus. As a child it is a rounded panel. Its children
+ * get a palette that suits the mask colour, whatever the desktop's theme.
  */
 class ToolkitBlurFrame : public QWidget
 {
@@ -31,6 +31,7 @@ public:
 
 protected:
     bool event(QEvent* event) override;
+    void keyPressEvent(QKeyEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
     void resizeEvent(QResizeEvent* event) override;
 

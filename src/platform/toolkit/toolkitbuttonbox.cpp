@@ -95,6 +95,8 @@ void ToolkitButtonBox::setButtonList(const QList<QAbstractButton*>& buttons, boo
 void ToolkitButtonBox::addButton(QAbstractButton* button)
 {
     button->setCheckable(m_checkable);
+    // The group makes them exclusive anyway; this makes them radio buttons to assistive programs.
+    button->setAutoExclusive(m_checkable);
     m_group->addButton(button);
     m_layout->addWidget(button);
 }

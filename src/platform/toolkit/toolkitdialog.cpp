@@ -5,6 +5,7 @@
 #include "toolkitsuggestbutton.h"
 #include "toolkittitlebar.h"
 #include "toolkitwarningbutton.h"
+#include "windowkeys.h"
 #include "windowmanagerhelper.h"
 
 #include <QKeyEvent>
@@ -94,7 +95,17 @@ void ToolkitDialog::setMessage(const QString& message)
     m_message = message;
     m_messageLabel->setText(displayText(message));
     m_messageLabel->setVisible(!message.isEmpty());
+    updateAccessibleTexts();
     updateMessageSize();
+}
+
+void ToolkitDialog::updateAccessibleTexts()
+{
+    // A screen reader announces a window by its name: without a title it is the message that says what this is about.
+    if (m_message.isEmpty())
+        return;
+    setAccessibleName(windowTitle().isEmpty() ? m_message : windowTitle());
+    setAccessibleDescription(windowTitle().isEmpty() ? QString() : m_message);
 }
 
 void ToolkitDialog::updateMessageSize()
@@ -185,6 +196,7 @@ void ToolkitDialog::focusFirst()
         if (reachable && isAncestorOf(next) && !m_titlebar->isAncestorOf(next))
             return next->setFocus();
     }
+    m_titlebar->focusCloseButton();
 }
 
 bool ToolkitDialog::event(QEvent* event)
@@ -193,6 +205,7 @@ bool ToolkitDialog::event(QEvent* event)
     switch (event->type()) {
     case QEvent::WindowTitleChange:
         m_titlebar->setTitle(windowTitle());
+        updateAccessibleTexts();
         break;
     case QEvent::WindowIconChange:
         if (testAttribute(Qt::WA_SetWindowIcon))
@@ -216,17 +229,8 @@ bool ToolkitDialog::event(QEvent* event)
 
 void ToolkitDialog::keyPressEvent(QKeyEvent* event)
 {
-    if (event->matches(QKeySequence::Cancel)) {
-        close();
-        return;
-    }
-    if (event->key() == Qt::Key_Return || event->key() == Qt::Key_Enter) {
-        if (auto* button = qobject_cast<QAbstractButton*>(focusWidget())) {
-            button->click();
-            return;
-        }
-    }
-    QDialog::keyPressEvent(event);
+    if (!windowkeys::handle(this, event))
+        QDialog::keyPressEvent(event);
 }
 
 void ToolkitDialog::resizeEvent(QResizeEvent* event)

@@ -68,6 +68,7 @@ private:
     void updateSurface();
     void updateShape();
     void updateMessageSize();
+    void updateAccessibleTexts();
     void focusFirst();
 
     ToolkitTitlebar* m_titlebar;

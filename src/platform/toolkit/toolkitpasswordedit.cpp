@@ -17,6 +17,7 @@ namespace
 
 constexpr int signSize = 28;
 constexpr int signInset = 4;
+constexpr int revealKey = Qt::CTRL | Qt::Key_R;
 
 /// Whether Caps Lock is on, as far as an X server can tell.
 bool capsLockOn()
@@ -38,7 +39,7 @@ public:
     {
         setObjectName(QStringLiteral("echoButton"));
         setCheckable(true);
-        // Not in the Tab order: Tab goes from one field to the next.
+        // Not in the Tab order: Tab goes from one field to the next, and the field knows a key for this.
         setFocusPolicy(Qt::NoFocus);
         setCursor(Qt::ArrowCursor);
         setAttribute(Qt::WA_Hover);
@@ -135,7 +136,9 @@ void ToolkitPasswordEdit::setRevealed(bool revealed)
                         Qt::ImhNoAutoUppercase);
     const QString name = revealed ? QStringLiteral("隐藏密码") : QStringLiteral("显示密码");
     m_echoButton->setAccessibleName(name);
-    m_echoButton->setToolTip(name);
+    const QString key = QKeySequence(revealKey).toString(QKeySequence::NativeText);
+    m_echoButton->setAccessibleDescription(key);
+    m_echoButton->setToolTip(name + QStringLiteral(" (%1)").arg(key));
 }
 
 void ToolkitPasswordEdit::setClearIcon(const QIcon& icon)
@@ -202,6 +205,8 @@ void ToolkitPasswordEdit::keyPressEvent(QKeyEvent* event)
         event->accept();
         return;
     }
+    if (m_echoButtonVisible && QKeySequence(int(event->modifiers()) | event->key()) == QKeySequence(revealKey))
+        return m_echoButton->toggle();
     ToolkitLineEdit::keyPressEvent(event);
 }
 

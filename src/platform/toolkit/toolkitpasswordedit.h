@@ -8,7 +8,7 @@ class QAbstractButton;
 class ToolkitToolButton;
 
 /**
- * A line edit for a password. A button inside it reveals the text until it is pressed again or the field disappears;
+ * A line edit for a password. A button inside it, or Ctrl+R, reveals the text until used again or the field disappears;
  * text that is hidden cannot be copied, cut or dragged out. Under X11 a sign shows that Caps Lock is on while the
  * field has the focus.
  */

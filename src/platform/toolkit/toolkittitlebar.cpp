@@ -29,7 +29,9 @@ public:
         setToolTip(name);
         setAttribute(Qt::WA_Hover);
         setFocusPolicy(Qt::TabFocus);
-        setPopupMode(QToolButton::InstantPopup);
+        // Assistive programs are offered no press of a button that opens a menu, even if it has none.
+        if (sign == Sign::Menu)
+            setPopupMode(QToolButton::InstantPopup);
     }
 
 protected:
@@ -70,11 +72,11 @@ private:
 
 ToolkitTitlebar::ToolkitTitlebar(QWidget* parent)
     : QWidget(parent), m_icon(new ToolkitLabel(this)), m_title(new ToolkitLabel(this)),
-      m_menuButton(new SignButton(SignButton::Sign::Menu, QStringLiteral("菜单"), this))
+      m_menuButton(new SignButton(SignButton::Sign::Menu, QStringLiteral("菜单"), this)),
+      m_closeButton(new SignButton(SignButton::Sign::Close, QStringLiteral("关闭"), this))
 {
-    auto* closeButton = new SignButton(SignButton::Sign::Close, QStringLiteral("关闭"), this);
-    closeButton->setObjectName(QStringLiteral("titlebarCloseButton"));
-    connect(closeButton, &QToolButton::clicked, this, [this] { window()->close(); });
+    m_closeButton->setObjectName(QStringLiteral("titlebarCloseButton"));
+    connect(m_closeButton, &QToolButton::clicked, this, [this] { window()->close(); });
 
     auto* layout = new QHBoxLayout(this);
     layout->setContentsMargins(12, 0, 10, 0);
@@ -82,7 +84,7 @@ ToolkitTitlebar::ToolkitTitlebar(QWidget* parent)
     layout->addWidget(m_icon);
     layout->addWidget(m_title, 1);
     layout->addWidget(m_menuButton);
-    layout->addWidget(closeButton);
+    layout->addWidget(m_closeButton);
     m_icon->hide();
     m_menuButton->hide();
     setBackgroundTransparent(false);
@@ -119,6 +121,11 @@ void ToolkitTitlebar::setMenuVisible(bool visible)
 void ToolkitTitlebar::updateMenuButton()
 {
     m_menuButton->setVisible(m_menuVisible && m_menuButton->menu());
+}
+
+void ToolkitTitlebar::focusCloseButton()
+{
+    m_closeButton->setFocus();
 }
 
 void ToolkitTitlebar::setBackgroundTransparent(bool transparent)

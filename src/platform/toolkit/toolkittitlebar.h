@@ -30,6 +30,9 @@ public:
     /// Whether the bar leaves its background to the window below it. Otherwise it fills it with the window colour.
     void setBackgroundTransparent(bool transparent);
 
+    /// Gives the close button the focus: for windows in which nothing else can take it.
+    void focusCloseButton();
+
 signals:
     /// The user moved the window by dragging the bar; emitted once for each drag, when it begins.
     void windowDragged();
@@ -45,6 +48,7 @@ private:
     ToolkitLabel* m_icon;
     ToolkitLabel* m_title;
     QToolButton* m_menuButton;
+    QToolButton* m_closeButton;
     bool m_menuVisible = true;
     bool m_pressed = false;
     bool m_dragging = false;

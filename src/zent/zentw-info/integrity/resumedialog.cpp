@@ -51,6 +51,7 @@ void resumeDialog::createInterface()
 
     auto* heading = new ToolkitLabel(QStringLiteral("设备完整性校验失败"), content);
     heading->setFixedWidth(150);
+    setAccessibleName(heading->text());
     m_message = new ToolkitLabel(content);
     m_message->setFixedSize(210, 36);
     m_message->setWordWrap(true);
@@ -79,6 +80,7 @@ void resumeDialog::createInterface()
 void resumeDialog::setRepairTitle(const QString& text)
 {
     m_message->setText(text);
+    setAccessibleDescription(text);
     // Two lines fit; the tool tip shows what a longer report has beyond them.
     m_message->setToolTip(ToolkitLabel::plainToolTip(text));
 }

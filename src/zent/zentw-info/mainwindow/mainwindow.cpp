@@ -101,6 +101,7 @@ MainWindow::~MainWindow()
 void MainWindow::createPanel()
 {
     setFixedWidth(kWindowWidth);
+    setAccessibleName(productName());
     const bool showRelease = isScenceUser() || isAdminUser();
 
     titlebar = new ToolkitTitlebar(this);

@@ -27,7 +27,7 @@ void MainWindow::showSystemTrayIcon()
         sysTrayIcon->setIcon(QIcon(QStringLiteral(":/images/finalogo.svg")));
     else
         connect(ThemeHelper::instance(), &ThemeHelper::themeTypeChanged, this, &MainWindow::setSysThemetype);
-    sysTrayIcon->setToolTip(tr("终端域管平台"));
+    sysTrayIcon->setToolTip(productName());
     connect(sysTrayIcon, &QSystemTrayIcon::activated, this, [this](QSystemTrayIcon::ActivationReason reason) {
         trayClicks.pass(*sysTrayIcon, reason, [this](auto meant) { onActivatedSysTrayIcon(meant); });
     });

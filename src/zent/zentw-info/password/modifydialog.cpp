@@ -122,6 +122,7 @@ void ModifyDialog::createDialog()
 void ModifyDialog::retranslateDialog()
 {
     m_title->setText(tr("修改密码"));
+    setAccessibleName(m_title->text());
     m_confirm->setText(tr("确认"));
     m_cancel->setText(tr("取消"));
     const QIcon cross(QStringLiteral(":/images/button_tab_close_normal.svg"));

@@ -40,6 +40,7 @@ const QByteArray kControlCenterPath = QByteArrayLiteral("/com/vantor/oxa/control
 closeGuarddialog::closeGuarddialog(QWidget* parent) : ToolkitDialog(parent)
 {
     setIcon(QIcon(QStringLiteral(":/images/title.svg")));
+    setAccessibleName(tr("解除管控"));
     setFixedSize(400, 200);
     createContent();
     connect(HttpRequest::GetInstance(), &HttpRequest::sigRemoveStatus, this, &closeGuarddialog::onRemoveDomainStatus);

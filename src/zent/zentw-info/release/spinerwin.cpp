@@ -77,7 +77,7 @@ void spinerWin::createContent()
 void spinerWin::showFirstForm()
 {
     m_state = Running;
-    m_label->setText(tr("解除中,请稍后..."));
+    showText(tr("解除中,请稍后..."));
     delete m_later;
     delete m_now;
     m_later = nullptr;
@@ -87,6 +87,13 @@ void spinerWin::showFirstForm()
     m_confirm->setEnabled(false);
     m_buttonRow->addWidget(m_confirm, 0, Qt::AlignCenter);
     m_confirm->show();
+}
+
+void spinerWin::showText(const QString& text)
+{
+    m_label->setText(text);
+    // A window whose name changes is announced anew by screen readers.
+    setAccessibleName(text);
 }
 
 void spinerWin::nextCliked()
@@ -121,7 +128,7 @@ void spinerWin::closing()
 {
     m_confirm->hide();
     m_buttonRow->removeWidget(m_confirm);
-    m_label->setText(tr("当前终端已解除管控,重启后生效"));
+    showText(tr("当前终端已解除管控,重启后生效"));
     if (m_later)
         return;
     m_later = new ToolkitPushButton(tr("稍后重启"), this);

@@ -46,6 +46,7 @@ private:
 
     void createContent();
     void showFirstForm();
+    void showText(const QString& text);
 
     int m_state = Running;
     QString m_username;
