@@ -12,8 +12,8 @@ import sys
 
 import roomclient
 from desktop import Desktop, stop
-from stage import (INTEGRITY_SIZE, LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE, RELEASE_LINK,
-                   RELEASE_SIZE, SPINNER_SIZE, Stage)
+from stage import (INTEGRITY_SIZE, LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE,
+                   RELEASE_LINK, RELEASE_SIZE, SPINNER_SIZE, Stage)
 
 BACKGROUND = "#3d5a80"
 

@@ -12,8 +12,8 @@ import sys
 
 import roomclient
 from desktop import Desktop, stop
-from stage import (INTEGRITY_SIZE, LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE, RELEASE_LINK,
-                   RELEASE_SIZE, SPINNER_SIZE, Stage)
+from stage import (INTEGRITY_SIZE, LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE,
+                   RELEASE_LINK, RELEASE_SIZE, SPINNER_SIZE, Stage)
 
 BACKGROUNDS = {"light": "#8fa3b8", "dark": "#16202c"}
 SCENE_BOX = (180, -110)
@@ -22,8 +22,14 @@ WIDE_BUTTON = (214, -30)
 REVEAL_BUTTON = (-33, 116)
 BUBBLE = "#B3261E"
 ACCENT = "#0067D6"
+WARNING = "#C62828"
 USERINFO = "/etc/zent/userinfo.json"
 PLAIN_USER = "uid=1000(zhangsan) gid=1000(zhangsan) groups=1000(zhangsan),1002(zent-users)"
+
+
+def alerting(colours):
+    """Whether the colours of a picture are those of a window with an alert on it."""
+    return BUBBLE in colours
 
 
 class Gallery(Stage):
@@ -35,9 +41,13 @@ class Gallery(Stage):
         self.suffix = f"-{theme}-{desktop.scale:g}"
         self.taken = []
 
-    def shoot(self, name, window, moving=False, colour=None):
-        """A picture of the part of the screen where a window is, once it is steady, moves or has the colour."""
+    def shoot(self, name, window, until=None, most=sys.maxsize):
+        """A picture of the part of the screen where a window is, cut to a width, once it is steady.
+
+        Or, with until, once until(colours) is true for the text that lists the picture's colours.
+        """
         path = os.path.join(self.directory, name + self.suffix + ".png")
+        seen = []
 
         def shot():
             geometry = self.desktop.geometry(window)
@@ -45,24 +55,25 @@ class Gallery(Stage):
                 return False
             x, y, width, height = geometry
             # Without the time, so that equal pictures are equal files.
-            subprocess.run(["import", "-window", "root", "-crop", f"{width}x{height}+{x}+{y}", "+repage", "-strip",
-                            "-define", "png:exclude-chunk=date,time", path], env=self.desktop.env, check=True)
+            subprocess.run(["import", "-window", "root", "-crop", f"{min(width, most)}x{height}+{x}+{y}", "+repage",
+                            "-strip", "-define", "png:exclude-chunk=date,time", path], env=self.desktop.env, check=True)
+            if until:
+                return until(self.colours_of(path))
             with open(path, "rb") as stream:
-                content = stream.read()
+                seen.append(stream.read())
             # A blinking cursor makes two pictures, in turns.
-            same = content in (seen[-1:] if moving else seen[-3:])
-            seen.append(content)
-            if colour:
-                return colour in self.desktop.run("convert", path, "-unique-colors", "txt:-")
-            return same != moving and len(seen) > 1
+            return seen[-1] in seen[-4:-1]
 
-        seen = []
         self.desktop.wait(f"the picture {name}", shot)
         self.taken.append(path)
 
+    def colours_of(self, path):
+        """The colours of a picture, as text."""
+        return self.desktop.run("convert", path, "-unique-colors", "-depth", "8", "txt:-")
+
     def colours(self, window):
         """The colours of a window on the screen, as text."""
-        return self.desktop.run("sh", "-c", f"import -window {window} -unique-colors txt:-")
+        return self.desktop.run("sh", "-c", f"import -window {window} -unique-colors -depth 8 txt:-")
 
     def start(self):
         """Starts the client and opens its panel."""
@@ -125,7 +136,7 @@ class Gallery(Stage):
         self.keys(scenes, "Escape")
         self.gone(scenes)
         tint2, _ = self.desktop.windows("tint2")[0]
-        self.shoot("tray", tint2)
+        self.shoot("tray", tint2, most=round(200 * self.desktop.scale))
 
     def messages(self):
         """The desktop notification, the notice dialog's forms and the box after a failed call."""
@@ -188,7 +199,7 @@ class Gallery(Stage):
         self.keys(dialog, "Caps_Lock")
         self.fill_password(dialog, "Zent@2026", "New@2026x", "New@2026y")
         self.keys(dialog, "Tab")
-        self.shoot("password-mismatch", dialog, colour=BUBBLE)
+        self.shoot("password-mismatch", dialog, until=alerting)
         self.keys(dialog, "shift+Tab", "ctrl+a")
         self.type(dialog, "New@2026x")
         self.desktop.click_in(dialog, *REVEAL_BUTTON)
@@ -205,7 +216,7 @@ class Gallery(Stage):
                 self.gone(box)
             else:
                 self.keys(dialog, "Return")
-                self.shoot("password-" + name, dialog, colour=BUBBLE)
+                self.shoot("password-" + name, dialog, until=alerting)
         self.keys(dialog, "Escape")
         self.gone(dialog)
 
@@ -225,14 +236,20 @@ class Gallery(Stage):
             self.shoot(name, box)
             self.keys(box, "Escape")
             self.gone(box)
-        roomclient.add_fault({"path": "/uim/v3/client/remove"}, {"delay_ms": 2000}, 1)
+        # The worker takes a second. Once the window has drawn itself, the client waits here for the identity service.
+        roomclient.add_fault({"dbus": "onDomainConfig"}, {"delay_ms": 500}, 1)
+        roomclient.add_fault({"dbus": "Set", "service": "com.vantor.zent.iam"}, {"delay_ms": 4000}, 1)
         self.type(dialog, "Admin@2026")
         self.keys(dialog, "Return")
         spinner = self.dialog(SPINNER_SIZE)
-        self.shoot("release-running", spinner, moving=True)
+        # Until it has drawn itself, the dialog's button is seen in its place.
+        self.shoot("release-running", spinner, until=lambda colours: WARNING not in colours)
+        if ACCENT in self.colours_of(self.taken[-1]):
+            print("release-running: the worker was faster than the camera", file=sys.stderr)
+            os.remove(self.taken.pop())
         # The prompt is the first of this window's forms with a button in this colour.
-        roomclient.wait_syslog(".....execute hide-module:", 30)
-        self.shoot("release-reboot", spinner, colour=ACCENT)
+        self.desktop.wait("the prompt", lambda: ACCENT in self.colours(spinner), 30)
+        self.shoot("release-reboot", spinner)
 
     def all(self):
         """Every scene; returns the pictures' files."""

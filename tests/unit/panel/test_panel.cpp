@@ -212,7 +212,10 @@ private slots:
             const auto lightness = [child](QPalette::ColorRole role) {
                 return child->palette().color(role).lightness();
             };
-            if (lightness(QPalette::Window) < 200 || lightness(QPalette::Base) < 200 || lightness(QPalette::Text) > 60)
+            // The check box shows this colour only as its frame.
+            const bool frameOnly = child->objectName() == "onTop";
+            if ((!frameOnly && lightness(QPalette::Window) < 200) || lightness(QPalette::Base) < 200 ||
+                lightness(QPalette::Text) > 60)
                 dark.append(child->objectName());
         }
         QApplication::setPalette(before);
