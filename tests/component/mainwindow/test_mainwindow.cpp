@@ -102,9 +102,9 @@ private slots:
     void networkPage_data()
     {
         addColumns<QJsonObject, QString>("fault", "fields");
-        const QString two = R"([{"IsPrimaryConnection": false, "HwAddress": "no"}, {"IsPrimaryConnection": true,
-            "HwAddress": "m", "Speed": "s", "Ip4": {"Address": "a", "Mask": "k", "Gateways": [], "Dnses": []}}])";
-        addRow("second primary", QJsonObject{{"value", two}}, "m|a|||k|s");
+        const QString three = R"([{"IsPrimaryConnection": false, "HwAddress": "no"}, {"IsPrimaryConnection": true,
+            "HwAddress": "m", "Speed": "s", "Ip4": {"Address": "a", "Mask": "k", "Gateways": [], "Dnses": []}}, {}])";
+        addRow("second primary", QJsonObject{{"value", three}}, "m|a|||k|s");
         addRow("none primary", QJsonObject{{"value", "[{}]"}}, "|||||");
         addRow("object", QJsonObject{{"value", "{}"}}, "old");
         addRow("not json", QJsonObject{{"value", "["}}, "old");
