@@ -9,7 +9,6 @@
 
 #include <QDebug>
 #include <QJsonDocument>
-#include <QRegExp>
 
 namespace
 {
@@ -218,19 +217,16 @@ bool HttpRequest::matchesRule(const QString& rule, const QString& name, QString&
     if (rule.isEmpty())
         return false;
     ruleLog(__LINE__).debug() << "terminal Name Regular " << rule;
-    const QRegExp expression(rule, Qt::CaseSensitive);
-    if (!expression.isValid()) {
+    const zent::PcNameMatch match = zent::matchPcName(rule, name);
+    if (!match.validRule) {
         message = kRuleInvalid;
         return false;
     }
-    const bool found = expression.indexIn(name) >= 0;
-    if (found)
-        ruleLog(__LINE__).debug() << "满足部分==" << expression.cap();
-    if (!found || expression.matchedLength() != name.length()) {
+    if (match.found)
+        ruleLog(__LINE__).debug() << "满足部分==" << match.text;
+    if (!match.whole)
         message = kNameRefused;
-        return false;
-    }
-    return true;
+    return match.whole;
 }
 
 void HttpRequest::onCaCert(const int& statusCode, const QString& data)

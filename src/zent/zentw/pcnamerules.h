@@ -38,4 +38,23 @@ PcNameRule parsePcNameRule(const QByteArray& json);
 /// The rule without one leading and one trailing slash, as it may arrive as /pattern/.
 QString withoutSlashes(const QString& rule);
 
+/// Whether the rule may be compiled. The old regular expressions are matched without backtracking, but a few bytes
+/// from the server could keep them compiling or looking ahead for hours, or overflow the stack: counted repetitions
+/// multiply, and a group inside a group is a deeper call. Bounded are the length, the depth of groups, the number of
+/// characters that is left when every counted repetition is written out, and looking ahead while looking ahead.
+bool isBearableRule(const QString& rule);
+
+/// What a naming rule finds in a name.
+struct PcNameMatch {
+    /// False when the rule is no regular expression, or not a bearable one; nothing is searched then.
+    bool validRule = false;
+    bool found = false;
+    /// The match is the whole name.
+    bool whole = false;
+    QString text;
+};
+
+/// The first match of `rule`, case-sensitive and in the old syntax, in `name`.
+PcNameMatch matchPcName(const QString& rule, const QString& name);
+
 } // namespace zent

@@ -154,7 +154,16 @@ private slots:
         addRow("match inside only", rule("[0-9]"), "a1b", false, refused);
         addRow("case-sensitive", rule("[a-z]+"), "ABC", false, refused);
         addRow("only a slash", rule("/"), "abc", false, "");
-        addRow("invalid", rule("[a-z"), "abc", false, QStringLiteral("正则表达式不合法"));
+        const QString invalid = QStringLiteral("正则表达式不合法");
+        addRow("invalid", rule("[a-z"), "abc", false, invalid);
+        addRow("longest name", rule("[a-z]{1,255}"), QString(255, 'a'), true, "");
+        // Each of these would take very long, or end the process, if it were compiled or searched.
+        addRow("counts in counts", rule("((((((a?){8}){8}){8}){8}){8})"), "a", false, invalid);
+        addRow("counts beside a class", rule("[](]((((((a?){8}){8}){8}){8}){8})"), "(a", false, invalid);
+        addRow("1000 optional characters", rule(QString("a?").repeated(1000)), "a", false, invalid);
+        addRow("deep groups", rule(QString(20000, '(') + 'a' + QString(20000, ')')), "a", false, invalid);
+        addRow("ahead within ahead", rule(QString("(?=.*").repeated(6) + 'x' + QString(6, ')')), QString(64, 'a'), false,
+               invalid);
         addRow("broken inner text", "[1,", "abc", false, QStringLiteral("域管服务配置失败，请重试"));
         addRow("no rule", "{}", "abc", false, QStringLiteral("服务端返回终端规则数据为空"));
     }
