@@ -9,7 +9,7 @@ namespace zent::legacy
 /// Seeds the generator behind random().
 void seedRandom(unsigned int seed);
 
-/// The next number of the C library's sequence, the one seeded by seedRandom().
+/// The next number of the sequence that seedRandom() began; the same seed gives the same numbers on every terminal.
 int random();
 
 /// Starts one command line, split at blanks, as a detached process; false when nothing was started.
