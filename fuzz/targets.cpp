@@ -172,7 +172,7 @@ double secondsSpent()
 QString matchNames(const QByteArray& input)
 {
     constexpr int kLongestName = 255;
-    constexpr double kMostSeconds = 2;
+    constexpr double kMostSeconds = 5;
     const int split = input.indexOf('\n');
     const QString rule = QString::fromUtf8(input.left(split));
     const QString name = split < 0 ? QString() : QString::fromUtf8(input.mid(split + 1)).left(kLongestName);

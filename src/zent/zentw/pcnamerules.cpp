@@ -18,10 +18,12 @@ bool isSuccess(const QJsonObject& reply)
     return reply.value(QLatin1String("code")).toInt(-1) == 0;
 }
 
-/// Far above any rule for names of at most 255 characters; a rule at all limits compiles and matches in under a second.
+/// Far above any rule for names of at most 255 characters; rules at the limits have taken up to a second.
 constexpr int kMaxRuleLength = 1024;
 constexpr int kMaxRuleDepth = 32;
 constexpr int kMaxWrittenOut = 400;
+constexpr int kLookAheadWeight = 8;
+constexpr int kBackReferenceWeight = 40;
 
 /// Walks over a rule and counts what compiling it would make of it. Where it is unsure it counts too much.
 class RuleMeasure
@@ -69,7 +71,9 @@ private:
             break;
         case '\\':
             ++m_at;
-            break;
+            // A reference back is compared anew on every way to it.
+            add(at(m_at).isDigit() ? kBackReferenceWeight : characterWeight());
+            return true;
         case '*':
         case '+':
         case '?':
@@ -77,9 +81,12 @@ private:
         default:
             break;
         }
-        add(1);
+        add(characterWeight());
         return true;
     }
+
+    /// What is looked ahead for is searched again from every character of the name.
+    int characterWeight() const { return m_groups.back().looksAhead ? kLookAheadWeight : 1; }
 
     bool openGroup()
     {

@@ -41,7 +41,8 @@ QString withoutSlashes(const QString& rule);
 /// Whether the rule may be compiled. The old regular expressions are matched without backtracking, but a few bytes
 /// from the server could keep them compiling or looking ahead for hours, or overflow the stack: counted repetitions
 /// multiply, and a group inside a group is a deeper call. Bounded are the length, the depth of groups, the number of
-/// characters that is left when every counted repetition is written out, and looking ahead while looking ahead.
+/// characters that is left when every counted repetition is written out (a reference back, and a character that is
+/// looked ahead for, count many times), and looking ahead while looking ahead.
 bool isBearableRule(const QString& rule);
 
 /// What a naming rule finds in a name.

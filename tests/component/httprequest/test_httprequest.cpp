@@ -156,14 +156,17 @@ private slots:
         addRow("only a slash", rule("/"), "abc", false, "");
         const QString invalid = QStringLiteral("正则表达式不合法");
         addRow("invalid", rule("[a-z"), "abc", false, invalid);
+        addRow("looks ahead", rule("(?=.*[0-9])(?!.*--)[a-z0-9-]{3,20}"), "pc-17", true, "");
         addRow("longest name", rule("[a-z]{1,255}"), QString(255, 'a'), true, "");
         // Each of these would take very long, or end the process, if it were compiled or searched.
         addRow("counts in counts", rule("((((((a?){8}){8}){8}){8}){8})"), "a", false, invalid);
         addRow("counts beside a class", rule("[](]((((((a?){8}){8}){8}){8}){8})"), "(a", false, invalid);
         addRow("1000 optional characters", rule(QString("a?").repeated(1000)), "a", false, invalid);
         addRow("deep groups", rule(QString(20000, '(') + 'a' + QString(20000, ')')), "a", false, invalid);
-        addRow("ahead within ahead", rule(QString("(?=.*").repeated(6) + 'x' + QString(6, ')')), QString(64, 'a'), false,
+        addRow("ahead with references", rule("((a)|(?=a+(?:a\\1{1,18}){5}(a?[a-z]*\\1){28})|\\1)*b{21}\\1"), "a", false,
                invalid);
+        addRow("ahead within ahead", rule(QString("(?=.*").repeated(6) + 'x' + QString(6, ')')), QString(64, 'a'),
+               false, invalid);
         addRow("broken inner text", "[1,", "abc", false, QStringLiteral("域管服务配置失败，请重试"));
         addRow("no rule", "{}", "abc", false, QStringLiteral("服务端返回终端规则数据为空"));
     }
