@@ -23,6 +23,8 @@ REVEAL_BUTTON = (-33, 116)
 BUBBLE = "#B3261E"
 ACCENT = "#0067D6"
 WARNING = "#C62828"
+# A point of the reboot prompt's right button, beside its text; the form before has nothing there.
+PROMPT_BUTTON = (225, 128)
 USERINFO = "/etc/zent/userinfo.json"
 PLAIN_USER = "uid=1000(zhangsan) gid=1000(zhangsan) groups=1000(zhangsan),1002(zent-users)"
 
@@ -71,9 +73,14 @@ class Gallery(Stage):
         """The colours of a picture, as text."""
         return self.desktop.run("convert", path, "-unique-colors", "-depth", "8", "txt:-")
 
+    def colour_at(self, path, x, y):
+        """The colour of a point of a picture, given at scale 1, as text."""
+        x, y = round(x * self.desktop.scale), round(y * self.desktop.scale)
+        return self.desktop.run("convert", path, "-crop", f"1x1+{x}+{y}", "-depth", "8", "txt:-")
+
     def colours(self, window):
         """The colours of a window on the screen, as text."""
-        return self.desktop.run("sh", "-c", f"import -window {window} -unique-colors -depth 8 txt:-")
+        return self.desktop.run("sh", "-c", f"import -window {window} png:- | convert png:- -unique-colors -depth 8 txt:-")
 
     def start(self):
         """Starts the client and opens its panel."""
@@ -244,11 +251,13 @@ class Gallery(Stage):
         spinner = self.dialog(SPINNER_SIZE)
         # Until it has drawn itself, the dialog's button is seen in its place.
         self.shoot("release-running", spinner, until=lambda colours: WARNING not in colours)
-        if ACCENT in self.colours_of(self.taken[-1]):
+        if ACCENT in self.colour_at(self.taken[-1], *PROMPT_BUTTON):
             print("release-running: the worker was faster than the camera", file=sys.stderr)
             os.remove(self.taken.pop())
-        # The prompt is the first of this window's forms with a button in this colour.
-        self.desktop.wait("the prompt", lambda: ACCENT in self.colours(spinner), 30)
+        path = os.path.join(self.directory, "release-reboot" + self.suffix + ".png")
+        self.shoot("release-reboot", spinner, until=lambda _: ACCENT in self.colour_at(path, *PROMPT_BUTTON))
+        # Once more, without what was still being drawn.
+        self.taken.pop()
         self.shoot("release-reboot", spinner)
 
     def all(self):
