@@ -62,7 +62,18 @@ class ClientTest(unittest.TestCase):
     def start_shown(self):
         """Starts the client and opens its panel; returns the panel's window."""
         self.start()
-        self.desktop.click_icon(button=3)
+        return self.show_panel()
+
+    def show_panel(self):
+        """Opens the panel from a tray whose icon may still be finding its place; returns the panel's window."""
+        def clicks():
+            return sum("reason : 1" in line for line in roomclient.syslog_lines())
+
+        def click_arrives(before=clicks()):
+            self.desktop.click_icon(button=3)
+            return clicks() > before
+
+        self.until("the right click", click_arrives)
         self.desktop.click_icon()
         return self.desktop.wait("the panel", self.desktop.panel)
 
