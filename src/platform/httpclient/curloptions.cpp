@@ -22,11 +22,9 @@ bool appendHeader(HeaderList& list, const char* header)
 
 } // namespace
 
-HeaderList makeHeaders(const Request& request)
+HeaderList makeHeaders(const char* contentType)
 {
     HeaderList list;
-    // A name without a value keeps the header away.
-    const char* contentType = request.body.isEmpty() ? "Content-Type:" : "Content-Type: application/json";
     if (!appendHeader(list, contentType) || !appendHeader(list, "Expect:"))
         return nullptr;
     return list;
@@ -75,6 +73,8 @@ void setMessage(OptionSetter& options, const Request& request, const curl_slist*
         options.set(CURLOPT_POSTFIELDSIZE_LARGE, static_cast<curl_off_t>(request.body.size()));
         options.set(CURLOPT_CUSTOMREQUEST, request.method.constData());
     } else {
+        options.set(CURLOPT_CUSTOMREQUEST, static_cast<const char*>(nullptr));
+        options.set(CURLOPT_POSTFIELDS, static_cast<const char*>(nullptr));
         options.set(CURLOPT_HTTPGET, 1L);
     }
 }

@@ -50,8 +50,9 @@ private:
     CURLcode m_result = CURLE_OK;
 };
 
-/// The header lines that differ from curl's own; null when memory is short.
-HeaderList makeHeaders(const Request& request);
+/// The header lines that differ from curl's own; null when memory is short. A name without a value, in `contentType`,
+/// too, keeps the header away.
+HeaderList makeHeaders(const char* contentType);
 
 /// Bounds time and size.
 void setLimits(OptionSetter& options, long timeoutMs);

@@ -3,10 +3,8 @@
 #include "curloptions.h"
 #include "hostguard.h"
 
-#include <QDateTime>
 #include <QDebug>
 #include <QFile>
-#include <QFileInfo>
 #include <QUrl>
 
 #include <curl/curl.h>
@@ -18,6 +16,8 @@
 #include <csignal>
 #include <ctime>
 #include <map>
+
+#include <sys/stat.h>
 
 namespace
 {
@@ -162,22 +162,32 @@ public:
     void setTimeout(int seconds)
     {
         m_timeoutMs = std::clamp(seconds * 1000LL, 1000LL, static_cast<long long>(INT_MAX));
+        m_configured = false;
     }
-    void setSsl(const SslConfig& ssl) { m_ssl = ssl; }
+    void setSsl(const SslConfig& ssl)
+    {
+        m_ssl = ssl;
+        m_configured = false;
+    }
     int send(QString& reply, const QByteArray& method, const QString& url, const QString& body);
 
 private:
     HostGuard& guardOf(const QUrl& url);
     CURLcode perform(const Request& request, QByteArray& reply, long& status);
-    CURLcode prepare(const Request& request, const curl_slist* headers, ReplyBuffer& buffer);
-    QString sslFingerprint() const;
+    CURLcode prepare(const Request& request, ReplyBuffer& buffer);
+    void configure(OptionSetter& options);
+    QByteArray sslFingerprint() const;
     bool openHandle();
     void dropConnections();
 
     EasyHandle m_handle;
+    const HeaderList m_headers = zent::http::makeHeaders("Content-Type:");
+    const HeaderList m_jsonHeaders = zent::http::makeHeaders("Content-Type: application/json");
     std::map<QString, std::unique_ptr<HostGuard>> m_guards;
     SslConfig m_ssl;
-    QString m_fingerprint;
+    QByteArray m_fingerprint;
+    /// Whether the handle has the options that all requests share.
+    bool m_configured = false;
     long m_timeoutMs = 2000;
     std::array<char, CURL_ERROR_SIZE> m_error{};
     HostGuard::Outcome m_outcome = HostGuard::Outcome::Unknown;
@@ -225,12 +235,11 @@ CURLcode HttpClientApi::Session::perform(const Request& request, QByteArray& rep
         return CURLE_URL_MALFORMAT;
     if (!openHandle())
         return CURLE_FAILED_INIT;
-    const HeaderList headers = makeHeaders(request);
-    if (!headers)
+    if (!m_headers || !m_jsonHeaders)
         return CURLE_OUT_OF_MEMORY;
 
     ReplyBuffer buffer;
-    CURLcode result = prepare(request, headers.get(), buffer);
+    CURLcode result = prepare(request, buffer);
     if (result == CURLE_OK) {
         result = curl_easy_perform(m_handle.get());
         m_outcome = outcomeOf(m_handle.get(), result);
@@ -244,51 +253,64 @@ CURLcode HttpClientApi::Session::perform(const Request& request, QByteArray& rep
         m_error[0] = '\0';
         result = CURLE_FILESIZE_EXCEEDED;
     }
-    // The handle outlives what the options point to.
-    curl_easy_reset(m_handle.get());
     reply = buffer.body;
     return result;
 }
 
-CURLcode HttpClientApi::Session::prepare(const Request& request, const curl_slist* headers, ReplyBuffer& buffer)
+/// Sets what one request needs, and what all share where that is new. What the former request's options point to is
+/// gone; each of them is set anew here.
+CURLcode HttpClientApi::Session::prepare(const Request& request, ReplyBuffer& buffer)
 {
     OptionSetter options(m_handle.get());
+    if (!m_configured)
+        configure(options);
+    setMessage(options, request, (request.body.isEmpty() ? m_headers : m_jsonHeaders).get());
+    options.set(CURLOPT_WRITEDATA, &buffer);
+    options.set(CURLOPT_HEADERDATA, &buffer);
+    m_configured = options.result() == CURLE_OK;
+    return options.result();
+}
+
+void HttpClientApi::Session::configure(OptionSetter& options)
+{
     options.set(CURLOPT_ERRORBUFFER, m_error.data());
     setLimits(options, m_timeoutMs);
     setConfinement(options);
     setTls(options, m_ssl);
-    setMessage(options, request, headers);
     options.set(CURLOPT_WRITEFUNCTION, &ReplyBuffer::appendBody);
-    options.set(CURLOPT_WRITEDATA, &buffer);
     options.set(CURLOPT_HEADERFUNCTION, &ReplyBuffer::noteHeader);
-    options.set(CURLOPT_HEADERDATA, &buffer);
-    return options.result();
 }
 
-/// Changes whenever a file of the SSL configuration is named, written or removed.
-QString HttpClientApi::Session::sslFingerprint() const
+/// Changes whenever a file of the SSL configuration is named, written, replaced or removed.
+QByteArray HttpClientApi::Session::sslFingerprint() const
 {
-    QString text;
+    QByteArray bytes;
     for (const QString& path : {m_ssl.ca, m_ssl.cert, m_ssl.key}) {
-        const QFileInfo info(path);
-        text += path + QLatin1Char('\n');
-        if (!path.isEmpty() && info.exists())
-            text += QString::number(info.lastModified().toMSecsSinceEpoch()) + QLatin1Char(' ') +
-                    QString::number(info.size()) + QLatin1Char('\n');
+        const QByteArray name = QFile::encodeName(path);
+        bytes += name + '\0';
+        struct stat status = {};
+        if (path.isEmpty() || stat(name.constData(), &status) != 0)
+            continue;
+        for (const auto number :
+             {static_cast<qint64>(status.st_mtim.tv_sec), static_cast<qint64>(status.st_mtim.tv_nsec),
+              static_cast<qint64>(status.st_size), static_cast<qint64>(status.st_ino)})
+            bytes.append(reinterpret_cast<const char*>(&number), sizeof number);
     }
-    return text;
+    return bytes;
 }
 
 /// A kept connection was made with the files as they were then, and curl holds on to the authorities it has read; both
 /// end with the handle.
 bool HttpClientApi::Session::openHandle()
 {
-    const QString fingerprint = sslFingerprint();
+    const QByteArray fingerprint = sslFingerprint();
     if (fingerprint != m_fingerprint)
         dropConnections();
     m_fingerprint = fingerprint;
-    if (!m_handle && initializeCurl())
+    if (!m_handle && initializeCurl()) {
         m_handle.reset(curl_easy_init());
+        m_configured = false;
+    }
     return m_handle != nullptr;
 }
 

@@ -28,6 +28,14 @@ QString ToolkitLabel::plainToolTip(const QString& text)
 
 void ToolkitLabel::shrinkFontToWidth()
 {
+    // Measuring loads the fonts, which cost more than everything else in a client whose panel nobody has opened.
+    m_shrinkWhenShown = !isVisible();
+    if (!m_shrinkWhenShown)
+        shrinkNow();
+}
+
+void ToolkitLabel::shrinkNow()
+{
     constexpr int smallest = 8;
     QFont smaller = font();
     for (int size = QFontInfo(smaller).pixelSize();
@@ -53,6 +61,10 @@ int ToolkitLabel::baseline() const
 
 bool ToolkitLabel::event(QEvent* event)
 {
+    if (event->type() == QEvent::Show && m_shrinkWhenShown) {
+        m_shrinkWhenShown = false;
+        shrinkNow();
+    }
     if (event->type() == QEvent::ToolTip && toolTip().isEmpty() && overflows()) {
         QToolTip::showText(static_cast<QHelpEvent*>(event)->globalPos(), plainToolTip(text()), this);
         return true;

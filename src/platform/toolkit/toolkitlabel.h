@@ -17,7 +17,8 @@ public:
     /// The string to hand to a tool tip so that it reads exactly as @p text, even if @p text looks like mark-up.
     static QString plainToolTip(const QString& text);
 
-    /// Makes the font smaller, in whole pixels and to no less than 8, until the text fits the label's width.
+    /// Makes the font smaller, in whole pixels and to no less than 8, until the text fits the label's width; a hidden
+    /// label waits for that until it is shown.
     void shrinkFontToWidth();
 
     /// The y coordinate of a single line's baseline. Where the label is lower than the font's line, the line is
@@ -29,6 +30,9 @@ protected:
     void paintEvent(QPaintEvent* event) override;
 
 private:
+    void shrinkNow();
     bool overflows() const;
     void drawLine(QPainter& painter) const;
+
+    bool m_shrinkWhenShown = false;
 };

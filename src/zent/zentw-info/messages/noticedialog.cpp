@@ -91,7 +91,6 @@ void NoticeDialog::createInterface()
     if (!WindowManagerHelper::instance()->hasBlurWindow())
         m_contentFrame->setMaskAlpha(kOpaque);
 
-    m_titleView = createTextView(kTitleHeight, QFont::Medium, QStringLiteral("消息标题"));
     m_senderLabel = createDetailLabel();
     m_timeLabel = createDetailLabel();
     auto* details = new QHBoxLayout;
@@ -105,18 +104,30 @@ void NoticeDialog::createInterface()
     QPalette lineColors = line->palette();
     lineColors.setColor(QPalette::WindowText, QColor(0, 0, 0, 40));
     line->setPalette(lineColors);
-    m_contentView = createTextView(kContentHeight, QFont::Normal, QStringLiteral("消息内容"));
 
     auto* layout = new QVBoxLayout(m_contentFrame);
     layout->setObjectName(QStringLiteral("mainLayout"));
     layout->setSpacing(3);
     layout->setContentsMargins(5, 5, 5, 5);
-    layout->addWidget(m_titleView);
     layout->addLayout(details);
     layout->addWidget(line, 0, Qt::AlignHCenter);
-    layout->addWidget(m_contentView);
     layout->addLayout(createButtons());
     addContent(m_contentFrame, Qt::AlignHCenter);
+}
+
+void NoticeDialog::createTextViews()
+{
+    if (m_titleView)
+        return;
+    m_titleView = createTextView(kTitleHeight, QFont::Medium, QStringLiteral("消息标题"));
+    m_contentView = createTextView(kContentHeight, QFont::Normal, QStringLiteral("消息内容"));
+    auto* layout = qobject_cast<QVBoxLayout*>(m_contentFrame->layout());
+    layout->insertWidget(0, m_titleView);
+    // Above the buttons, also for Tab.
+    layout->insertWidget(layout->count() - 1, m_contentView);
+    setTabOrder(m_titleView, m_contentView);
+    setTabOrder(m_contentView, m_firstButton);
+    setTabOrder(m_firstButton, m_nextButton);
 }
 
 QPlainTextEdit* NoticeDialog::createTextView(int height, int weight, const QString& accessibleName)
@@ -208,6 +219,7 @@ void NoticeDialog::onMessageList(bool ok, const NotifyMessageResponse& response)
 
 void NoticeDialog::showMessage(const NotifyMessage& message)
 {
+    createTextViews();
     setTitle(QStringLiteral("消息详情"));
     m_titleView->setPlainText(message.title);
     m_senderLabel->setText(QStringLiteral("发送人: ") + message.send_uid);

@@ -44,6 +44,8 @@ protected:
 
 private:
     void createInterface();
+    /// Made for the first message: text views load fonts, which a client without a message does without.
+    void createTextViews();
     QPlainTextEdit* createTextView(int height, int weight, const QString& accessibleName);
     QLabel* createDetailLabel();
     QLayout* createButtons();

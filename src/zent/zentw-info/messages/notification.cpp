@@ -48,8 +48,9 @@ QSslConfiguration platformSsl()
 {
     QSslConfiguration ssl = QSslConfiguration::defaultConfiguration();
     const QList<QSslCertificate> authorities = QSslCertificate::fromPath(zent::kServerCertPath);
-    if (!authorities.isEmpty())
-        ssl.setCaCertificates(QSslConfiguration::systemCaCertificates() + authorities);
+    // Added, not set: a configuration whose authorities were set holds all of the system's in memory, otherwise the one
+    // needed is looked up when it is needed.
+    ssl.addCaCertificates(authorities);
     return ssl;
 }
 

@@ -67,9 +67,10 @@ void InfoPage::setValue(int row, const QString& text, Overflow overflow)
     ToolkitLabel* label = m_values[row];
     // A screen reader meets the value alone; its name says what the value is, and says it whole.
     label->setAccessibleName(m_captions[row]->text() + QStringLiteral("：") + text);
-    const QFontMetrics metrics = label->fontMetrics();
-    if (overflow == Overflow::Elide && metrics.horizontalAdvance(text) > label->width()) {
-        label->setText(metrics.elidedText(text, Qt::ElideMiddle, label->width()));
+    // No character is wider than the font is high, and measuring loads the fonts, which a short text does not need.
+    const bool mayOverflow = text.size() * label->font().pixelSize() > label->width();
+    if (overflow == Overflow::Elide && mayOverflow && label->fontMetrics().horizontalAdvance(text) > label->width()) {
+        label->setText(label->fontMetrics().elidedText(text, Qt::ElideMiddle, label->width()));
         label->setToolTip(ToolkitLabel::plainToolTip(text));
     } else {
         label->setText(text);
