@@ -46,6 +46,8 @@ ToolkitMessageBox::ToolkitMessageBox(Icon icon, const QString& title, const QStr
     : QMessageBox(icon, title, text, QMessageBox::Ok, parent)
 {
     setTextFormat(Qt::PlainText);
+    // The client's texts are Chinese whether Qt's translations are installed or not.
+    button(QMessageBox::Ok)->setText(QStringLiteral("确定"));
     button(QMessageBox::Ok)->setIcon(QIcon());
     // Set on the label, since setIconPixmap() would make the box forget which kind it is.
     if (auto* label = findChild<QLabel*>(QStringLiteral("qt_msgboxex_icon_label")))
