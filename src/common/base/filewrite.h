@@ -12,7 +12,7 @@ enum class WriteResult {
     Short,     ///< not written whole; the old content stands where the directory was writable
 };
 
-/// Replaces the content of the file at `path`: through a temporary file beside it where the directory is writable, so
+/// Replaces the content of the file at `path`: through a hidden file beside it where the directory is writable, so
 /// that a reader or a crash never meets half a file; otherwise truncated and written in place.
 WriteResult replaceFile(const QString& path, const QByteArray& content);
 

@@ -147,10 +147,7 @@ QString FileConfig::getMacAddress() const
 void FileConfig::saveCert(const QString& base64Content, const QString& filePath)
 {
     QDir().mkpath(QFileInfo(filePath).path());
-    QFile file(filePath);
-    if (!file.open(QIODevice::WriteOnly)) {
+    const QByteArray content = QByteArray::fromBase64(base64Content.toLatin1());
+    if (zent::base::replaceFile(filePath, content) != zent::base::WriteResult::Done)
         qWarning() << "writeCERT open error! " << filePath;
-        return;
-    }
-    file.write(QByteArray::fromBase64(base64Content.toLatin1()));
 }
