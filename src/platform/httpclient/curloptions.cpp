@@ -1,5 +1,7 @@
 #include "curloptions.h"
 
+#include "replylimit.h"
+
 #include <QFile>
 
 #include <algorithm>
@@ -37,7 +39,7 @@ void setLimits(OptionSetter& options, long timeoutMs)
     options.set(CURLOPT_NOSIGNAL, 1L);
     // Without it a handle waits for its resolver thread, however long the name server stays silent.
     options.set(CURLOPT_QUICK_EXIT, 1L);
-    options.set(CURLOPT_MAXFILESIZE_LARGE, kMaxReplyBytes);
+    options.set(CURLOPT_MAXFILESIZE_LARGE, static_cast<curl_off_t>(kMaxReplyBytes));
 }
 
 void setConfinement(OptionSetter& options)

@@ -12,7 +12,6 @@ namespace zent::http
 {
 
 constexpr long kConnectTimeoutMs = 1500;
-constexpr curl_off_t kMaxReplyBytes = 16 * 1024 * 1024;
 
 struct Request {
     QByteArray method;

@@ -2,6 +2,7 @@
 
 #include "curloptions.h"
 #include "hostguard.h"
+#include "replylimit.h"
 
 #include <QDebug>
 #include <QFile>

@@ -150,6 +150,8 @@ public slots:
     void openNotice();
 
 signals:
+    /// The scenes were asked for and did not come.
+    void scenesNotKnown();
     void sizeChanged();
     void newMessage();
     void readNotify(QString uuid);

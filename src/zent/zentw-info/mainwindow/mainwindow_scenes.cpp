@@ -10,6 +10,7 @@
 #include "noconfig.h"
 #include "paths.h"
 #include "replies.h"
+#include "replywatch.h"
 #include "toolkitmessagebox.h"
 #include "urlquery.h"
 
@@ -101,7 +102,7 @@ void MainWindow::getAllUserEnvironment()
     qDebug() << "getAllUserEnvironment"
              << " strVersion:" << version->header();
     version->apply(request);
-    sceneManager->get(request);
+    zent::watchReply(sceneManager->get(request));
 }
 
 void MainWindow::rcvEvninfoData(QNetworkReply* reply)
@@ -109,6 +110,7 @@ void MainWindow::rcvEvninfoData(QNetworkReply* reply)
     reply->deleteLater();
     if (reply->attribute(QNetworkRequest::HttpStatusCodeAttribute).toInt() != kHttpOk) {
         qDebug() << "get net reqruest failed!";
+        emit scenesNotKnown();
         return;
     }
     QByteArray body = reply->readAll();
@@ -124,6 +126,8 @@ int MainWindow::analyseEvnData(QByteArray* body)
     qDebug() << "analyseEvnData"
              << "@@@@@@@--------------scene info for combobox !";
     const auto reply = zent::parseSceneReply(*body);
+    if (!reply.isGood())
+        emit scenesNotKnown();
     if (reply.state == zent::ReplyState::NotJson)
         return 0;
     if (!reply.isGood()) {

@@ -2,6 +2,7 @@
 
 #include "gethttpheader.h"
 #include "paths.h"
+#include "replywatch.h"
 #include "urlquery.h"
 
 #include <QDateTime>
@@ -24,19 +25,12 @@ namespace
 {
 
 constexpr int kTransferTimeoutMs = 30000;
-constexpr int kHttpOk = 200;
 constexpr int kLargestShownNumber = 99;
 constexpr int kWaitSliceMs = 100;
 
 const QString kUnreadParameter = QStringLiteral("is_not_read");
 /// Misspelt by the service, too; its value only makes each URL unique.
 const QString kTimeParameter = QStringLiteral("timestaps");
-
-bool succeeded(const QNetworkReply* reply)
-{
-    return reply->error() == QNetworkReply::NoError &&
-           reply->attribute(QNetworkRequest::HttpStatusCodeAttribute).toInt() == kHttpOk;
-}
 
 QString timeStamp()
 {
@@ -124,7 +118,7 @@ int QNotification::getNotifyMessageList(const NotifyMessageOption& option, list_
     qDebug() << "Rquest[GET]: " << url;
     const QNetworkRequest request = makeRequest(url, "getNotifyMessageList");
     m_listCallbacks.insert(url, std::move(callback));
-    m_listManager->get(request);
+    zent::watchReply(m_listManager->get(request));
     return 0;
 }
 
@@ -162,7 +156,7 @@ void QNotification::put(QNetworkAccessManager* manager, const QString& baseUrl, 
     qDebug() << "Qurl" << url;
     const QNetworkRequest request = makeRequest(url, caller);
     callbacks.insert(url, std::move(callback));
-    manager->put(request, body);
+    zent::watchReply(manager->put(request, body));
 }
 
 void QNotification::messageListRequestFinished(QNetworkReply* reply)
@@ -174,12 +168,16 @@ void QNotification::messageListRequestFinished(QNetworkReply* reply)
         return;
     NotifyMessageResponse response;
     response.is_not_read = QUrlQuery(reply->request().url()).queryItemValue(kUnreadParameter).toInt() == 1;
-    const bool ok = succeeded(reply);
+    const bool ok = zent::succeeded(reply);
     if (ok) {
         response.total = reply->rawHeader("X-Total-Count").toInt();
         response.limit = reply->rawHeader("X-Total-Limit").toInt();
         response.offset = reply->rawHeader("X-Total-Offset").toInt();
-        response.messages = zent::parseMessageList(reply->readAll());
+        const QByteArray body = reply->readAll();
+        response.messages = zent::parseMessageList(body);
+        // The count alone is what most callers want; a list that is asked for and is none leaves a trace.
+        if (response.messages.isEmpty() && !body.isEmpty() && body.trimmed() != "[]")
+            qWarning() << "the message list holds no message";
     }
     callback(ok, response);
 }
@@ -199,7 +197,7 @@ void QNotification::finishRead(QNetworkReply* reply, ReadCallbacks& callbacks)
     reply->deleteLater();
     const read_message_callback callback = callbacks.take(reply->request().url());
     if (callback)
-        callback(succeeded(reply), reply->errorString());
+        callback(zent::succeeded(reply), reply->errorString());
 }
 
 QString QNotification::getCurrentTime()

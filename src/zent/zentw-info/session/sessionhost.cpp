@@ -14,9 +14,14 @@
 #include <QDBusConnection>
 #include <QDBusError>
 #include <QDebug>
+#include <QTimer>
 
 namespace
 {
+
+/// When scenes that did not come are asked for again: about as often as the unread messages.
+constexpr int kScenesAgainEarliestMs = 60000;
+constexpr int kScenesAgainLatestMs = 180000;
 
 /// Whether a message pushed to `username` is for the session's user; one that names nobody is for everybody.
 bool isForSessionUser(const QString& username)
@@ -118,4 +123,10 @@ void SessionHost::askScenesAfterOrganisation()
             disconnect(m_organisationConnection);
             m_window.getAllUserEnvironment();
         });
+    auto* again = new QTimer(this);
+    again->setObjectName(QStringLiteral("scenesAgain"));
+    again->setSingleShot(true);
+    connect(again, &QTimer::timeout, &m_window, &MainWindow::getAllUserEnvironment);
+    connect(&m_window, &MainWindow::scenesNotKnown, again,
+            [this, again] { again->start(m_window.generateRandnum(kScenesAgainLatestMs, kScenesAgainEarliestMs)); });
 }
