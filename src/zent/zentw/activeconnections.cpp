@@ -1,13 +1,37 @@
 #include "activeconnections.h"
 
+#include "jsontypes.h"
+
 #include <QJsonDocument>
 #include <QJsonObject>
+
+#include <algorithm>
 
 namespace zent
 {
 
 namespace
 {
+
+bool isConnection(const QJsonValue& value)
+{
+    const QJsonObject object = value.toObject();
+    const QJsonObject ip4 = object.value(QLatin1String("Ip4")).toObject();
+    const auto startsWithText = [&ip4](const char* key) {
+        const QJsonArray texts = ip4.value(QLatin1String(key)).toArray();
+        return texts.isEmpty() || texts.first().isString();
+    };
+    return value.isObject() &&
+           base::hasTypes(object, {{"IsPrimaryConnection", QJsonValue::Bool},
+                                   {"HwAddress", QJsonValue::String},
+                                   {"Speed", QJsonValue::String},
+                                   {"Ip4", QJsonValue::Object}}) &&
+           base::hasTypes(ip4, {{"Address", QJsonValue::String},
+                                {"Mask", QJsonValue::String},
+                                {"Gateways", QJsonValue::Array},
+                                {"Dnses", QJsonValue::Array}}) &&
+           startsWithText("Gateways") && startsWithText("Dnses");
+}
 
 ActiveConnection connectionFromJson(const QJsonObject& object)
 {
@@ -28,9 +52,10 @@ ActiveConnection connectionFromJson(const QJsonObject& object)
 std::optional<QJsonArray> parseConnectionArray(const QByteArray& json)
 {
     const QJsonDocument document = QJsonDocument::fromJson(json);
-    if (!document.isArray())
+    const QJsonArray array = document.array();
+    if (!document.isArray() || !std::all_of(array.begin(), array.end(), isConnection))
         return std::nullopt;
-    return document.array();
+    return array;
 }
 
 std::vector<ActiveConnection> activeConnections(const QJsonArray& array)

@@ -22,7 +22,8 @@ struct ActiveConnection {
     QString dns;
 };
 
-/// The daemon's answer; nothing when `json` is not a JSON array.
+/// The daemon's answer; nothing when `json` is not a JSON array, or when what is read of a connection has another type
+/// than it should.
 std::optional<QJsonArray> parseConnectionArray(const QByteArray& json);
 
 /// The connections of the answer, in its order.

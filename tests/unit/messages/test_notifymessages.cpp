@@ -49,7 +49,7 @@ private slots:
     {
         const QMap<QByteArray, QStringList> cases = {
             {R"([{"title": "b%1"}, {"title": "a"}])", {"b%1", "a"}},
-            {R"([{}, {"title": 5}, 7, null])", {"", "", "", ""}},
+            {R"([{}, {"title": 5}, 7, null, {"uuid": "u", "read_at": null}])", {"", ""}},
             {R"({"title": "x"})", {}},
             {"<html>", {}},
         };

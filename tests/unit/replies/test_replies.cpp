@@ -30,8 +30,11 @@ private slots:
             {user(R"({"gecos": "张三"})"), "张三|张三|||0"},
             {user(R"({"gecos": "张三,"})"), "张三||||0"},
             {user(R"({"supplementtary_groups": []})"), "||||0"},
-            {user(R"({"gecos": 5, "supplementtary_groups": {}, "id": "7", "client_name": null})"), "||||0"},
-            {user(R"({"supplementtary_groups": ["a"]})"), "||||0"},
+            {user(R"({"gecos": null, "id": "7", "client_name": null})"), "||||0"},
+            {user(R"({"gecos": 5})"), "failed"},
+            {user(R"({"client_name": []})"), "failed"},
+            {user(R"({"supplementtary_groups": {}})"), "failed"},
+            {user(R"({"supplementtary_groups": ["a"]})"), "failed"},
             {user("[]"), "failed"},
             {R"({"code": 1, "data": {"user": {}}})", "failed"},
             {R"({"code": "0", "data": {"user": {}}})", "failed"},
@@ -65,6 +68,8 @@ private slots:
             {R"({"name": "公司"})", "公司", "failed"},
             {R"([{"name": "公司"}, {"name": "x"}])", "failed", "公司"},
             {"{}", "", "failed"},
+            {R"({"name": 1})", "failed", "failed"},
+            {R"([{"name": {}}])", "failed", "failed"},
             {"[]", "failed", "failed"},
             {"null", "failed", "failed"},
             {R"(["公司"])", "failed", "failed"},
@@ -87,8 +92,10 @@ private slots:
                 return text;
             });
         };
-        QCOMPARE(scenes(R"({"code": 0, "message": [{"scene_name": "内网", "scene_code": "a"}, {"scene_code": 3}, 4]})"),
-                 QString("内网|a;|;|;"));
+        QCOMPARE(scenes(R"({"code": 0, "message": [{"scene_name": "内网", "scene_code": "a"}, {}]})"),
+                 QString("内网|a;|;"));
+        for (const char* odd : {"4", R"({"scene_code": 3})", R"({"scene_name": []})"})
+            QCOMPARE(scenes(R"({"code": 0, "message": [{}, )" + QByteArray(odd) + "]}"), QString("failed"));
         QCOMPARE(scenes(R"({"code": 0, "message": {}})"), QString("failed"));
         QCOMPARE(scenes(R"({"code": 0, "message": []})"), QString());
     }

@@ -111,10 +111,12 @@ private slots:
         QCOMPARE(primaries(R"([{"HwAddress": "a"}, {"IsPrimaryConnection": true, "HwAddress": "b", "Speed": "1",
             "Ip4": {"Address": "2", "Mask": "3", "Gateways": ["4", "x"], "Dnses": ["5", "y"]}}])"),
                  QStringList("b12345"));
-        QCOMPARE(primaries(R"([{"IsPrimaryConnection": "yes"}, 7, null, {"IsPrimaryConnection": true, "HwAddress": 1,
-            "Speed": "1", "Ip4": {"Gateways": [], "Dnses": {}}}])"),
+        QCOMPARE(primaries(R"([{"IsPrimaryConnection": null}, {"IsPrimaryConnection": true, "HwAddress": null,
+            "Speed": "1", "Ip4": {"Gateways": []}}])"),
                  QStringList("1"));
-        QVERIFY(!zent::parseConnectionArray("{}") && !zent::parseConnectionArray(""));
+        for (const char* odd : {"{}", "", "[7]", R"([{"IsPrimaryConnection": "yes"}])", R"([{"HwAddress": 1}])",
+                                R"([{"Ip4": []}])", R"([{"Ip4": {"Dnses": {}}}])", R"([{"Ip4": {"Gateways": [4]}}])"})
+            QVERIFY2(!zent::parseConnectionArray(odd), odd);
     }
 
     void namingRules()

@@ -41,11 +41,14 @@ void MainWindow::toNetinfo()
 
 void MainWindow::updateNetInfo()
 {
-    const QString answer = networkProxy->activeConnectionInfo().value_or(QString());
-    const auto array = zent::parseConnectionArray(answer.toLocal8Bit());
+    const std::optional<QString> answer = networkProxy->activeConnectionInfo();
+    const auto array = zent::parseConnectionArray(answer.value_or(QString()).toLocal8Bit());
     // Without an answer both pages keep what they show.
-    if (!array)
+    if (!array) {
+        if (answer)
+            qWarning() << "GetActiveConnectionInfo gave no list of connections";
         return;
+    }
     if (infoPage == kLoginPage) {
         infoWidget->setLoginInfo({clientName, organizationName, gecosName, gecosLast, QString(), groupName});
         return;

@@ -1,9 +1,12 @@
 #include "replies.h"
 
+#include "jsontypes.h"
+
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QStringList>
 
+#include <algorithm>
 #include <optional>
 
 namespace zent
@@ -15,6 +18,8 @@ namespace
 const QString kCode = QStringLiteral("code");
 const QString kData = QStringLiteral("data");
 const QString kName = QStringLiteral("name");
+/// Misspelt by the server, too.
+const QString kGroups = QStringLiteral("supplementtary_groups");
 
 /// What all replies share: JSON, the code 0, and then `extract` finds the values in the object or nothing.
 template <typename T, typename Extract>
@@ -36,9 +41,27 @@ Reply<T> parseReply(const QByteArray& body, Extract extract)
 
 std::optional<QString> nameIn(const QJsonValue& value)
 {
-    if (!value.isObject())
+    if (!value.isObject() || !base::hasTypes(value.toObject(), {{"name", QJsonValue::String}}))
         return std::nullopt;
     return value.toObject().value(kName).toString();
+}
+
+/// Whether what is shown of a user has the right types; the number, which is only logged, need not.
+bool isUser(const QJsonValue& value)
+{
+    const QJsonObject user = value.toObject();
+    const QJsonArray groups = user.value(kGroups).toArray();
+    return value.isObject() &&
+           base::hasTypes(user, {{"gecos", QJsonValue::String},
+                                 {"client_name", QJsonValue::String},
+                                 {"supplementtary_groups", QJsonValue::Array}}) &&
+           (groups.isEmpty() || nameIn(groups.first()));
+}
+
+bool isScene(const QJsonValue& value)
+{
+    return value.isObject() &&
+           base::hasTypes(value.toObject(), {{"scene_name", QJsonValue::String}, {"scene_code", QJsonValue::String}});
 }
 
 } // namespace
@@ -47,15 +70,14 @@ Reply<UserData> parseUserReply(const QByteArray& body)
 {
     return parseReply<UserData>(body, [](const QJsonObject& reply) -> std::optional<UserData> {
         const QJsonValue value = reply.value(kData).toObject().value(QLatin1String("user"));
-        if (!value.isObject())
+        if (!isUser(value))
             return std::nullopt;
         const QJsonObject user = value.toObject();
         const QStringList gecos = user.value(QLatin1String("gecos")).toString().split(QLatin1Char(','));
         UserData data;
         data.gecosFirst = gecos.first();
         data.gecosLast = gecos.last();
-        // Misspelt by the server, too.
-        const QJsonArray groups = user.value(QLatin1String("supplementtary_groups")).toArray();
+        const QJsonArray groups = user.value(kGroups).toArray();
         data.groupName = groups.first().toObject().value(kName).toString();
         data.clientName = user.value(QLatin1String("client_name")).toString();
         data.id = user.value(QLatin1String("id")).toInt();
@@ -79,10 +101,11 @@ Reply<std::vector<Scene>> parseSceneReply(const QByteArray& body)
 {
     return parseReply<std::vector<Scene>>(body, [](const QJsonObject& reply) -> std::optional<std::vector<Scene>> {
         const QJsonValue message = reply.value(QLatin1String("message"));
-        if (!message.isArray())
+        const QJsonArray elements = message.toArray();
+        if (!message.isArray() || !std::all_of(elements.begin(), elements.end(), isScene))
             return std::nullopt;
         std::vector<Scene> scenes;
-        for (const QJsonValue& element : message.toArray()) {
+        for (const QJsonValue& element : elements) {
             const QJsonObject scene = element.toObject();
             scenes.push_back({scene.value(QLatin1String("scene_name")).toString(),
                               scene.value(QLatin1String("scene_code")).toString()});

@@ -1,6 +1,7 @@
 #include "notifymessages.h"
 
 #include "filecontent.h"
+#include "jsontypes.h"
 
 #include <QDateTime>
 #include <QJsonArray>
@@ -16,6 +17,18 @@ namespace
 constexpr int kHttpsPort = 443;
 /// The platform's users live at UTC+8, whatever zone the terminal is set to.
 constexpr int kDisplayOffsetSeconds = 28800;
+
+bool isMessage(const QJsonValue& value)
+{
+    constexpr QJsonValue::Type kText = QJsonValue::String;
+    return value.isObject() && base::hasTypes(value.toObject(), {{"uuid", kText},
+                                                                 {"uid", kText},
+                                                                 {"send_uid", kText},
+                                                                 {"title", kText},
+                                                                 {"content", kText},
+                                                                 {"created_at", kText},
+                                                                 {"read_at", kText}});
+}
 
 NotifyMessage messageFromJson(const QJsonObject& object)
 {
@@ -54,8 +67,10 @@ std::optional<NotifyConfig> parseNotifyConfig(const QByteArray& infoFile)
 QList<NotifyMessage> parseMessageList(const QByteArray& body)
 {
     QList<NotifyMessage> messages;
-    for (const QJsonValue& value : QJsonDocument::fromJson(body).array())
-        messages.append(messageFromJson(value.toObject()));
+    for (const QJsonValue& value : QJsonDocument::fromJson(body).array()) {
+        if (isMessage(value))
+            messages.append(messageFromJson(value.toObject()));
+    }
     return messages;
 }
 

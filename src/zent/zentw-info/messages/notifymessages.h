@@ -61,7 +61,8 @@ struct NotifyConfig {
 /// Reads the notification settings out of a terminal info file; nothing when it is not JSON.
 std::optional<NotifyConfig> parseNotifyConfig(const QByteArray& infoFile);
 
-/// The messages of a list reply in their order; none when the body is not a JSON array.
+/// The messages of a list reply in their order, without those that hold something else than texts; none when the body
+/// is not a JSON array.
 QList<NotifyMessage> parseMessageList(const QByteArray& body);
 
 /// A server time (UTC, ISO 8601) as it is shown, at UTC+8: "yyyy/MM/dd hh:mm" or, when `relative`, "今天 hh:mm" and
