@@ -191,7 +191,9 @@ class BusServices:
         inputs, outputs, function = service.methods[member]
         if message.get_signature() != inputs:
             raise CallError(ERROR + "InvalidArgs", f"{member} takes ({inputs})")
-        return outputs, action["value"] if "value" in action else function(*arguments)
+        if "value" in action:
+            return action.get("signature", outputs), action["value"]
+        return outputs, function(*arguments)
 
     def _property(self, service, member, arguments):
         with self._store.lock:

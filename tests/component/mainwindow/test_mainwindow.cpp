@@ -111,6 +111,10 @@ private slots:
         addRow("error", QJsonObject{{"error", "com.vantor.Error.Failed"}}, "old");
         addRow("no value", QJsonObject{{"no_value", true}}, "old");
         addRow("vanishes", QJsonObject{{"vanish", true}}, "old");
+        addRow("hangs until it ends", QJsonObject{{"vanish", true}, {"delay_ms", 500}}, "old");
+        addRow("absent", QJsonObject(), "old");
+        addRow("a number", QJsonObject{{"value", 7}, {"signature", "i"}}, "old");
+        addRow("odd types", QJsonObject{{"value", R"([{"IsPrimaryConnection": true, "Speed": 7}])"}}, "old");
     }
     void networkPage()
     {
@@ -129,9 +133,13 @@ private slots:
         m_window->onNetinfoClicked();
         const QString before = page();
         QCOMPARE(before.count('|'), 5);
+        if (fault.isEmpty())
+            m_platform.patchState({{"services", QJsonObject{{"network", false}}}});
         m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}}, fault);
+        LogCapture log;
         m_window->onNetinfoClicked();
         QCOMPARE(page(), fields == "old" ? before : fields);
+        QCOMPARE(log.contains("GetActiveConnectionInfo"), fields == "old");
         m_platform.patchState({{"services", QJsonObject{{"network", false}}}});
         m_platform.patchState({{"services", QJsonObject{{"network", true}}}});
     }

@@ -191,7 +191,9 @@ private slots:
         addRow("array", value("[{\"code\": 0}]"), "|", kNotChanged);
         addRow("no argument", QJsonObject{{"no_value", true}}, "|", kNotChanged);
         addRow("error", QJsonObject{{"error", "org.freedesktop.DBus.Error.AccessDenied"}}, "|", kNotChanged);
+        addRow("a number", QJsonObject{{"value", 0}, {"signature", "i"}}, "|", kNotChanged);
         addRow("vanishes", QJsonObject{{"vanish", true}}, "|", kNotChanged);
+        addRow("hangs until it ends", QJsonObject{{"vanish", true}, {"delay_ms", 500}}, "|", kNotChanged);
         addRow("absent", QJsonObject(), "|", kNotChanged);
     }
     void serviceAnswers()
@@ -209,6 +211,7 @@ private slots:
         confirm()->click();
         m_platform.patchState({{"services", QJsonObject{{"iam", true}}}});
         QCOMPARE(m_dialog->isHidden(), closes);
+        QCOMPARE(m_log->contains("pam模块返回数据错误,修改密码失败"), notice == kNotChanged);
         QCOMPARE(old()->alertMessage() + '|' + fresh()->alertMessage(), closes ? QString("|") : alerts);
         QCOMPARE(m_notices, notice == "none" ? QStringList() : QStringList{notice});
         QCOMPARE(repeat()->text(), closes ? QString() : kNew);

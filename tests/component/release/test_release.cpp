@@ -233,31 +233,40 @@ private slots:
 
     void failingStepStillEndsInThePrompt_data()
     {
-        addColumns<QJsonObject, QJsonObject, QString>("services", "fault", "box");
+        addColumns<QJsonObject, QString, QJsonObject, QString>("state", "method", "fault", "box");
         const QString leave = QStringLiteral("退域执行失败!");
         const QString disable = QStringLiteral("退域执行失败");
         const QJsonObject none;
-        addRow("agent answers an error", none, QJsonObject{{"error", "com.vantor.Error.Busy"}}, leave);
-        addRow("agent's answer is overdue", none, QJsonObject{{"error", "org.freedesktop.DBus.Error.NoReply"}}, leave);
-        addRow("agent ends during the call", none, QJsonObject{{"vanish", true}}, leave);
-        addRow("no agent", QJsonObject{{"zentg", false}}, none, leave);
-        addRow("Enable is read-only", none, QJsonObject{{"read_only", true}}, disable);
-        addRow("no identity service", QJsonObject{{"iam", false}}, none, disable);
-        addRow("no program can be started", none, none, "");
+        const auto away = [](const char* service) { return QJsonObject{{"services", QJsonObject{{service, false}}}}; };
+        const QJsonObject faults[] = {{{"error", "com.vantor.Error.Busy"}}, {{"vanish", true}}};
+        for (const QJsonObject& fault : faults) {
+            const QByteArray kind = fault.keys().value(0).toUtf8();
+            addRow("agent: " + kind, none, "onDomainConfig", fault, leave);
+            addRow("identity service: " + kind, none, "Set", fault, disable);
+        }
+        addRow("agent's answer is overdue", none, "onDomainConfig",
+               QJsonObject{{"error", "org.freedesktop.DBus.Error.NoReply"}}, leave);
+        addRow("agent answers nothing", none, "onDomainConfig", QJsonObject{{"no_value", true}}, leave);
+        addRow("agent answers a text", none, "onDomainConfig", QJsonObject{{"value", "0"}, {"signature", "s"}}, leave);
+        addRow("no agent", away("zentg"), "", none, leave);
+        addRow("identity service hangs until it ends", none, "Set", QJsonObject{{"vanish", true}, {"delay_ms", 500}},
+               disable);
+        addRow("Enable is read-only", QJsonObject{{"iam", QJsonObject{{"read_only", true}}}}, "", none, disable);
+        addRow("no identity service", away("iam"), "", none, disable);
+        addRow("no program can be started", none, "", none, "");
     }
 
     void failingStepStillEndsInThePrompt()
     {
-        QFETCH(QJsonObject, services);
+        QFETCH(QJsonObject, state);
+        QFETCH(QString, method);
         QFETCH(QJsonObject, fault);
         QFETCH(QString, box);
         const bool programs = !box.isEmpty();
-        if (!services.isEmpty())
-            m_platform.patchState({{"services", services}});
-        if (fault.contains("read_only"))
-            m_platform.patchState({{"iam", fault}});
-        else if (!fault.isEmpty())
-            m_platform.addFault({{"dbus", "onDomainConfig"}}, fault);
+        if (!state.isEmpty())
+            m_platform.patchState(state);
+        if (!fault.isEmpty())
+            m_platform.addFault({{"dbus", method}}, fault);
         if (!programs)
             qputenv("PATH", "/nonexistent");
         attempt(kAdministratorPassword);
@@ -270,6 +279,35 @@ private slots:
         QVERIFY(m_log->contains(box.isEmpty() || box.endsWith('!') ? box : QStringLiteral("Enable false 失败")));
         spinnerButton(QStringLiteral("稍后重启"))->click();
         QVERIFY(!spinner()->isVisible());
+    }
+
+    void refusedRebootCanBeTriedAgain_data()
+    {
+        addColumns<QJsonObject, bool>("fault", "refused");
+        addRow("error", QJsonObject{{"error", "org.freedesktop.DBus.Error.AccessDenied"}}, true);
+        addRow("vanishes", QJsonObject{{"vanish", true}}, true);
+        addRow("hangs until it ends", QJsonObject{{"vanish", true}, {"delay_ms", 500}}, true);
+        addRow("absent", QJsonObject(), true);
+        addRow("odd answer", QJsonObject{{"value", 7}, {"signature", "i"}}, false);
+    }
+    void refusedRebootCanBeTriedAgain()
+    {
+        QFETCH(QJsonObject, fault);
+        QFETCH(bool, refused);
+        if (fault.isEmpty())
+            m_platform.patchState({{"services", QJsonObject{{"login1", false}}}});
+        m_platform.addFault({{"dbus", "Reboot"}}, fault);
+        spinner()->show();
+        spinner()->onRemoveController();
+        QTRY_VERIFY(promptShown());
+        for (const int lines : {refused ? 2 : 1, 1}) {
+            const LogCapture log;
+            spinnerButton(QStringLiteral("立即重启"))->click();
+            QCOMPARE(log.count("reboot"), lines);
+            QVERIFY(promptShown());
+            m_platform.clearFaults();
+            m_platform.patchState({{"services", QJsonObject{{"login1", true}}}});
+        }
     }
 
     void hungAgentFreezesNothing()

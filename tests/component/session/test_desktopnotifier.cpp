@@ -45,6 +45,8 @@ public:
     /// The method that fails, or that never answers.
     QString failing;
     QString hanging;
+    /// What the failing method answers with: an error when this is empty, else "nothing" or this text.
+    QString odd;
     int asked = 0;
     QList<QVariantList> shown;
     uint lastId = 100;
@@ -73,7 +75,11 @@ private:
     {
         if (hanging == method)
             setDelayedReply(true);
-        else if (failing == method)
+        else if (failing == method && !odd.isEmpty()) {
+            setDelayedReply(true);
+            const QVariantList values = odd == "nothing" ? QVariantList() : QVariantList{odd};
+            QDBusConnection(m_name).send(message().createReply(values));
+        } else if (failing == method)
             sendErrorReply(QDBusError::Failed, "the server says no");
     }
 
@@ -198,22 +204,28 @@ private slots:
 
     void failureIsReported_data()
     {
-        addColumns<QString, QString, int>("failing", "hanging", "delayMs");
-        addRow("no service", "", "", 0);
-        addRow("capabilities fail", "GetCapabilities", "", 0);
-        addRow("notify fails", "Notify", "", 0);
-        addRow("capabilities hang", "", "GetCapabilities", 5000);
-        addRow("notify hangs", "", "Notify", 5000);
+        addColumns<QString, QString, int, QString>("failing", "hanging", "delayMs", "odd");
+        addRow("no service", "", "", 0, "");
+        addRow("capabilities fail", "GetCapabilities", "", 0, "");
+        addRow("capabilities are a text", "GetCapabilities", "", 0, "body");
+        addRow("capabilities without a value", "GetCapabilities", "", 0, "nothing");
+        addRow("notify fails", "Notify", "", 0, "");
+        addRow("notify gives a text", "Notify", "", 0, "101");
+        addRow("notify gives no value", "Notify", "", 0, "nothing");
+        addRow("capabilities hang", "", "GetCapabilities", 5000, "");
+        addRow("notify hangs", "", "Notify", 5000, "");
     }
     void failureIsReported()
     {
         QFETCH(QString, failing);
         QFETCH(QString, hanging);
         QFETCH(int, delayMs);
+        QFETCH(QString, odd);
         if (!failing.isEmpty() || !hanging.isEmpty()) {
             startServer();
             m_server->failing = failing;
             m_server->hanging = hanging;
+            m_server->odd = odd;
         }
         LogCapture log;
         QElapsedTimer clock;
