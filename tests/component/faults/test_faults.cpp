@@ -23,8 +23,8 @@ const QString kRefused = QStringLiteral("管理员账号或密码错误");
 const QString kNetwork = QStringLiteral("网络异常，请稍后重试");
 const QString kWrongTypes = QStringLiteral(R"({"code": 0, "message": [{"scene_name": 1}], "data": {"name": ["x"],
     "result": "true", "user": {"gecos": ["x"], "client_name": 7, "supplementtary_groups": "g"}}})");
-/// A poll waits for at most 2 s; this much more is the machine's.
-constexpr int kLongestGapMs = 3500;
+/// A poll holds the window up for 2 s at most; whatever else could takes 25 s or more. The rest is a busy machine's.
+constexpr int kLongestGapMs = 8000;
 constexpr int kPatienceMs = 20000;
 
 } // namespace
@@ -181,9 +181,6 @@ private slots:
         QNotification* messages = QNotification::qInstance;
         QVERIFY(!messages || messages->pendingRequests() == 0);
         LogCapture log;
-        m_longestGap = 0;
-        m_sinceBeat.start();
-        m_beat.start(5);
 
         // A session that starts during the fault: its polls go on until they are answered.
         serve(name, 2);
@@ -191,6 +188,9 @@ private slots:
         MainWindow::unreadMessageCount = 0;
         m_window = std::make_unique<MainWindow>(nullptr, 1020);
         m_host = std::make_unique<SessionHost>(*m_window);
+        m_longestGap = 0;
+        m_sinceBeat.start();
+        m_beat.start(5);
         const QString unknown = known();
         for (const QString& line : failedPolls)
             QTRY_VERIFY2_WITH_TIMEOUT(log.contains(line), qPrintable(log.lines().join('\n')), kPatienceMs);
