@@ -11,7 +11,7 @@ import sys
 
 TREE = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 ENTER = os.path.join(TREE, "sandbox", "enter")
-DESKTOP = os.path.join(TREE, "bench", "desktop.py")
+DESKTOP = os.path.join(TREE, "bench", "trayprograms.py")
 STARTS = 21
 IDLE_SECONDS = 60
 # What the client's timers may do in a minute after the start: one policy run, up to one poll of messages (a poll's

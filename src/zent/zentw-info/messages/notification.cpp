@@ -53,13 +53,15 @@ QSslConfiguration platformSsl()
 QNotification::QNotification(QObject* parent) : QObject(parent)
 {
     loadCfg();
-    m_listManager = new QNetworkAccessManager(this);
-    m_readManager = new QNetworkAccessManager(this);
-    m_readAllManager = new QNetworkAccessManager(this);
-    connect(m_listManager, SIGNAL(finished(QNetworkReply*)), this, SLOT(messageListRequestFinished(QNetworkReply*)));
-    connect(m_readManager, SIGNAL(finished(QNetworkReply*)), this, SLOT(messageReadRequestFinished(QNetworkReply*)));
-    connect(m_readAllManager, SIGNAL(finished(QNetworkReply*)), this,
-            SLOT(messageReadAllRequestFinished(QNetworkReply*)));
+}
+
+QNetworkAccessManager* QNotification::manager(QNetworkAccessManager*& member, const char* finishedSlot)
+{
+    if (!member) {
+        member = new QNetworkAccessManager(this);
+        connect(member, SIGNAL(finished(QNetworkReply*)), this, finishedSlot);
+    }
+    return member;
 }
 
 int QNotification::loadCfg()
@@ -118,7 +120,7 @@ int QNotification::getNotifyMessageList(const NotifyMessageOption& option, list_
     qDebug() << "Rquest[GET]: " << url;
     const QNetworkRequest request = makeRequest(url, "getNotifyMessageList");
     m_listCallbacks.insert(url, std::move(callback));
-    zent::watchReply(m_listManager->get(request));
+    zent::watchReply(manager(m_listManager, SLOT(messageListRequestFinished(QNetworkReply*)))->get(request));
     return 0;
 }
 
@@ -135,15 +137,15 @@ int QNotification::getNotifyMessageList(const QString& uid, bool isNotRead, int 
 
 int QNotification::readNotifyMessage(const QString& uuid, read_message_callback callback)
 {
-    put(m_readManager, m_readUrl, QStringLiteral("uuid"), uuid, "readNotifyMessage", m_readCallbacks,
-        std::move(callback));
+    put(manager(m_readManager, SLOT(messageReadRequestFinished(QNetworkReply*))), m_readUrl, QStringLiteral("uuid"),
+        uuid, "readNotifyMessage", m_readCallbacks, std::move(callback));
     return 0;
 }
 
 int QNotification::readAllNotifyMessage(const QString& uid, readall_message_callback callback)
 {
-    put(m_readAllManager, m_readAllUrl, QStringLiteral("uid"), uid, "readAllNotifyMessage", m_readAllCallbacks,
-        std::move(callback));
+    put(manager(m_readAllManager, SLOT(messageReadAllRequestFinished(QNetworkReply*))), m_readAllUrl,
+        QStringLiteral("uid"), uid, "readAllNotifyMessage", m_readAllCallbacks, std::move(callback));
     return 0;
 }
 

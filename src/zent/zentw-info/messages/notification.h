@@ -72,6 +72,9 @@ private slots:
 private:
     using ReadCallbacks = QMap<QUrl, read_message_callback>;
 
+    /// Made on first use: the first one of the process loads Qt's network management, which the tray icon shall not
+    /// wait for.
+    QNetworkAccessManager* manager(QNetworkAccessManager*& member, const char* finishedSlot);
     QNetworkRequest makeRequest(const QUrl& url, const char* caller);
     void put(QNetworkAccessManager* manager, const QString& baseUrl, const QString& key, const QString& value,
              const char* caller, ReadCallbacks& callbacks, read_message_callback callback);
@@ -84,8 +87,8 @@ private:
     QMap<QUrl, list_message_callback> m_listCallbacks;
     ReadCallbacks m_readCallbacks;
     ReadCallbacks m_readAllCallbacks;
-    QNetworkAccessManager* m_listManager;
-    QNetworkAccessManager* m_readManager;
-    QNetworkAccessManager* m_readAllManager;
+    QNetworkAccessManager* m_listManager = nullptr;
+    QNetworkAccessManager* m_readManager = nullptr;
+    QNetworkAccessManager* m_readAllManager = nullptr;
     QSslConfiguration m_ssl;
 };

@@ -1,7 +1,7 @@
 """Measures tray programs in a room with the simulated platform, and prints the figures as JSON.
 
-    desktop.py start RUNS NAME=PROGRAM...      milliseconds from the start of a program to its icon's request
-    desktop.py idle SECONDS NAME=PROGRAM...    memory after 20 s, then the switches and processor time of idle seconds
+    trayprograms.py start RUNS NAME=PROGRAM...      milliseconds from the start of a program to its icon's request
+    trayprograms.py idle SECONDS NAME=PROGRAM...    memory after 20 s, then the switches and processor time of idle seconds
 """
 
 import glob
