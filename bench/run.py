@@ -16,8 +16,8 @@ STARTS = 21
 IDLE_SECONDS = 60
 # What the client's timers may do in a minute after the start: one policy run, up to one poll of messages (a poll's
 # request, its answer and the time of the next), and what these make other threads do.
-TIMER_SWITCHES = 150
-TIMER_CPU_MS = 30
+TIMER_SWITCHES = 40
+TIMER_CPU_MS = 15
 REQUEST_RUNS = 11
 REQUESTS = 500
 LUNAR_RUNS = 11

@@ -8,7 +8,6 @@ import glob
 import json
 import os
 import re
-import subprocess
 import sys
 import time
 
@@ -16,7 +15,7 @@ HERE = os.path.dirname(os.path.abspath(__file__))
 sys.path.insert(0, os.path.join(HERE, "..", "sandbox"))
 
 import roomclient  # noqa: E402
-from desktop import Desktop  # noqa: E402
+from desktop import Desktop, end  # noqa: E402
 from trayprobe import TrayProbe  # noqa: E402
 
 SETTLING_S = 20
@@ -30,15 +29,6 @@ def quicken_id():
     with open(path, "w", encoding="utf-8") as stream:
         stream.write(QUICK_ID)
     os.chmod(path, 0o755)
-
-
-def end(process):
-    process.terminate()
-    try:
-        process.wait(5)
-    except subprocess.TimeoutExpired:
-        process.kill()
-        process.wait()
 
 
 def measure_start(desktop, probe, runs, programs):

@@ -41,13 +41,7 @@ class Desktop:
 
     def __exit__(self, *_):
         for process in reversed(self.processes):
-            if process.poll() is None:
-                process.terminate()
-                try:
-                    process.wait(5)
-                except subprocess.TimeoutExpired:
-                    process.kill()
-                    process.wait()
+            end(process)
 
     def _start_server(self):
         read_end, write_end = os.pipe()
@@ -213,6 +207,18 @@ class Desktop:
 
     def screenshot(self, path, window="root"):
         subprocess.run(["import", "-window", window, path], env=self.env, check=True)
+
+
+def end(process):
+    """Ends a process, if need be by force."""
+    if process.poll() is not None:
+        return
+    process.terminate()
+    try:
+        process.wait(5)
+    except subprocess.TimeoutExpired:
+        process.kill()
+        process.wait()
 
 
 def stop(process, number=signal.SIGTERM, timeout=10):

@@ -21,8 +21,6 @@ class HostGuard : public QObject
     Q_OBJECT
 
 public:
-    enum class State { Reachable, Unreachable, HeldBack };
-
     /// What a request that was sent tells about its host.
     enum class Outcome {
         Answered,        ///< a complete reply
@@ -35,7 +33,6 @@ public:
     HostGuard(const QString& host, quint16 port, QObject* parent = nullptr);
     ~HostGuard() override;
 
-    State state() const { return m_state; }
     /// Why a poll must not be sent now, for the log; empty when it may be.
     QString objection() const;
     /// The result of the request that brought the host into its state.
@@ -44,6 +41,8 @@ public:
     void note(Outcome outcome, int result);
 
 private:
+    enum class State { Reachable, Unreachable, HeldBack };
+
     QString name() const;
     void answersAgain();
     void startTry();

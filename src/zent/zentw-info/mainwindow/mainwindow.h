@@ -150,13 +150,13 @@ public slots:
     void openNotice();
 
 signals:
-    /// The scenes were asked for and did not come.
-    void scenesNotKnown();
     void sizeChanged();
     void newMessage();
     void readNotify(QString uuid);
     /// Asks for a refresh of the user data.
     void startgetMeInfo();
+    /// The scenes were asked for and did not come.
+    void scenesNotKnown();
 
 protected:
     void closeEvent(QCloseEvent* event) override;

@@ -27,7 +27,6 @@
 namespace
 {
 
-constexpr int kHttpOk = 200;
 constexpr int kSceneTransferTimeoutMs = 30000;
 constexpr int kSceneSwitchedBack = 3;
 constexpr int kStartPolicy = -1;
@@ -108,7 +107,7 @@ void MainWindow::getAllUserEnvironment()
 void MainWindow::rcvEvninfoData(QNetworkReply* reply)
 {
     reply->deleteLater();
-    if (reply->attribute(QNetworkRequest::HttpStatusCodeAttribute).toInt() != kHttpOk) {
+    if (!zent::succeeded(reply)) {
         qDebug() << "get net reqruest failed!";
         emit scenesNotKnown();
         return;

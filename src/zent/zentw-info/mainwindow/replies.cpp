@@ -1,12 +1,11 @@
 #include "replies.h"
 
-#include "jsontypes.h"
+#include "jsonreader.h"
 
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QStringList>
 
-#include <algorithm>
 #include <optional>
 
 namespace zent
@@ -17,9 +16,6 @@ namespace
 
 const QString kCode = QStringLiteral("code");
 const QString kData = QStringLiteral("data");
-const QString kName = QStringLiteral("name");
-/// Misspelt by the server, too.
-const QString kGroups = QStringLiteral("supplementtary_groups");
 
 /// What all replies share: JSON, the code 0, and then `extract` finds the values in the object or nothing.
 template <typename T, typename Extract>
@@ -41,27 +37,16 @@ Reply<T> parseReply(const QByteArray& body, Extract extract)
 
 std::optional<QString> nameIn(const QJsonValue& value)
 {
-    if (!value.isObject() || !base::hasTypes(value.toObject(), {{"name", QJsonValue::String}}))
-        return std::nullopt;
-    return value.toObject().value(kName).toString();
+    base::JsonReader reader(value);
+    const QString name = reader.text("name");
+    return reader.isGood() ? std::optional<QString>(name) : std::nullopt;
 }
 
-/// Whether what is shown of a user has the right types; the number, which is only logged, need not.
-bool isUser(const QJsonValue& value)
+std::optional<Scene> sceneIn(const QJsonValue& value)
 {
-    const QJsonObject user = value.toObject();
-    const QJsonArray groups = user.value(kGroups).toArray();
-    return value.isObject() &&
-           base::hasTypes(user, {{"gecos", QJsonValue::String},
-                                 {"client_name", QJsonValue::String},
-                                 {"supplementtary_groups", QJsonValue::Array}}) &&
-           (groups.isEmpty() || nameIn(groups.first()));
-}
-
-bool isScene(const QJsonValue& value)
-{
-    return value.isObject() &&
-           base::hasTypes(value.toObject(), {{"scene_name", QJsonValue::String}, {"scene_code", QJsonValue::String}});
+    base::JsonReader reader(value);
+    Scene scene{reader.text("scene_name"), reader.text("scene_code")};
+    return reader.isGood() ? std::optional<Scene>(scene) : std::nullopt;
 }
 
 } // namespace
@@ -70,18 +55,21 @@ Reply<UserData> parseUserReply(const QByteArray& body)
 {
     return parseReply<UserData>(body, [](const QJsonObject& reply) -> std::optional<UserData> {
         const QJsonValue value = reply.value(kData).toObject().value(QLatin1String("user"));
-        if (!isUser(value))
-            return std::nullopt;
-        const QJsonObject user = value.toObject();
-        const QStringList gecos = user.value(QLatin1String("gecos")).toString().split(QLatin1Char(','));
+        base::JsonReader user(value);
+        const QStringList gecos = user.text("gecos").split(QLatin1Char(','));
+        // Misspelt by the server, too.
+        const QJsonArray groups = user.array("supplementtary_groups");
+        const std::optional<QString> group = groups.isEmpty() ? QString() : nameIn(groups.first());
         UserData data;
         data.gecosFirst = gecos.first();
         data.gecosLast = gecos.last();
-        const QJsonArray groups = user.value(kGroups).toArray();
-        data.groupName = groups.first().toObject().value(kName).toString();
-        data.clientName = user.value(QLatin1String("client_name")).toString();
-        data.id = user.value(QLatin1String("id")).toInt();
-        data.permissions = user.value(QLatin1String("permissions")).toArray();
+        data.clientName = user.text("client_name");
+        if (!user.isGood() || !group)
+            return std::nullopt;
+        data.groupName = *group;
+        // These two are only logged, whatever they are.
+        data.id = value.toObject().value(QLatin1String("id")).toInt();
+        data.permissions = value.toObject().value(QLatin1String("permissions")).toArray();
         return data;
     });
 }
@@ -101,14 +89,14 @@ Reply<std::vector<Scene>> parseSceneReply(const QByteArray& body)
 {
     return parseReply<std::vector<Scene>>(body, [](const QJsonObject& reply) -> std::optional<std::vector<Scene>> {
         const QJsonValue message = reply.value(QLatin1String("message"));
-        const QJsonArray elements = message.toArray();
-        if (!message.isArray() || !std::all_of(elements.begin(), elements.end(), isScene))
+        if (!message.isArray())
             return std::nullopt;
         std::vector<Scene> scenes;
-        for (const QJsonValue& element : elements) {
-            const QJsonObject scene = element.toObject();
-            scenes.push_back({scene.value(QLatin1String("scene_name")).toString(),
-                              scene.value(QLatin1String("scene_code")).toString()});
+        for (const QJsonValue& element : message.toArray()) {
+            const auto scene = sceneIn(element);
+            if (!scene)
+                return std::nullopt;
+            scenes.push_back(*scene);
         }
         return scenes;
     });

@@ -1,7 +1,7 @@
 #include "notifymessages.h"
 
 #include "filecontent.h"
-#include "jsontypes.h"
+#include "jsonreader.h"
 
 #include <QDateTime>
 #include <QJsonArray>
@@ -18,23 +18,16 @@ constexpr int kHttpsPort = 443;
 /// The platform's users live at UTC+8, whatever zone the terminal is set to.
 constexpr int kDisplayOffsetSeconds = 28800;
 
-bool isMessage(const QJsonValue& value)
+/// Nothing when a value is no text.
+std::optional<NotifyMessage> messageFromJson(const QJsonValue& value)
 {
-    constexpr QJsonValue::Type kText = QJsonValue::String;
-    return value.isObject() && base::hasTypes(value.toObject(), {{"uuid", kText},
-                                                                 {"uid", kText},
-                                                                 {"send_uid", kText},
-                                                                 {"title", kText},
-                                                                 {"content", kText},
-                                                                 {"created_at", kText},
-                                                                 {"read_at", kText}});
-}
-
-NotifyMessage messageFromJson(const QJsonObject& object)
-{
-    const auto text = [&object](const char* key) { return object.value(QLatin1String(key)).toString(); };
-    return {text("uuid"),    text("uid"),        text("send_uid"), text("title"),
-            text("content"), text("created_at"), text("read_at")};
+    base::JsonReader reader(value);
+    NotifyMessage message{reader.text("uuid"),   reader.text("uid"),     reader.text("send_uid"),
+                          reader.text("title"),  reader.text("content"), reader.text("created_at"),
+                          reader.text("read_at")};
+    if (!reader.isGood())
+        return std::nullopt;
+    return message;
 }
 
 } // namespace
@@ -68,8 +61,8 @@ QList<NotifyMessage> parseMessageList(const QByteArray& body)
 {
     QList<NotifyMessage> messages;
     for (const QJsonValue& value : QJsonDocument::fromJson(body).array()) {
-        if (isMessage(value))
-            messages.append(messageFromJson(value.toObject()));
+        if (const auto message = messageFromJson(value))
+            messages.append(*message);
     }
     return messages;
 }

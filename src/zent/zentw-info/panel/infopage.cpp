@@ -24,6 +24,14 @@ void setTextColor(QWidget* widget, const QColor& color)
     widget->setPalette(palette);
 }
 
+/// False for a text so short that it fits without measuring, which loads the fonts: hardly a character is wider than
+/// its font is high, and the label fades out what is.
+bool mayOverflow(const ToolkitLabel& label, const QString& text)
+{
+    const int height = label.font().pixelSize();
+    return height < 1 || text.size() * height > label.width();
+}
+
 } // namespace
 
 InfoPage::InfoPage(const QVector<Row>& rows, QWidget* parent) : QWidget(parent)
@@ -67,9 +75,8 @@ void InfoPage::setValue(int row, const QString& text, Overflow overflow)
     ToolkitLabel* label = m_values[row];
     // A screen reader meets the value alone; its name says what the value is, and says it whole.
     label->setAccessibleName(m_captions[row]->text() + QStringLiteral("：") + text);
-    // No character is wider than the font is high, and measuring loads the fonts, which a short text does not need.
-    const bool mayOverflow = text.size() * label->font().pixelSize() > label->width();
-    if (overflow == Overflow::Elide && mayOverflow && label->fontMetrics().horizontalAdvance(text) > label->width()) {
+    if (overflow == Overflow::Elide && mayOverflow(*label, text) &&
+        label->fontMetrics().horizontalAdvance(text) > label->width()) {
         label->setText(label->fontMetrics().elidedText(text, Qt::ElideMiddle, label->width()));
         label->setToolTip(ToolkitLabel::plainToolTip(text));
     } else {

@@ -1,0 +1,44 @@
+#include "jsonreader.h"
+
+namespace zent::base
+{
+
+JsonReader::JsonReader(const QJsonValue& value) : m_object(value.toObject()), m_good(value.isObject())
+{
+}
+
+QJsonValue JsonReader::take(const char* key, QJsonValue::Type type)
+{
+    const QJsonValue value = m_object.value(QLatin1String(key));
+    m_good = m_good && (value.isUndefined() || value.isNull() || value.type() == type);
+    return value;
+}
+
+bool JsonReader::flag(const char* key)
+{
+    return take(key, QJsonValue::Bool).toBool();
+}
+
+QString JsonReader::text(const char* key)
+{
+    return take(key, QJsonValue::String).toString();
+}
+
+QJsonArray JsonReader::array(const char* key)
+{
+    return take(key, QJsonValue::Array).toArray();
+}
+
+QString JsonReader::firstText(const char* key)
+{
+    const QJsonArray texts = array(key);
+    m_good = m_good && (texts.isEmpty() || texts.first().isString());
+    return texts.first().toString();
+}
+
+QJsonObject JsonReader::object(const char* key)
+{
+    return take(key, QJsonValue::Object).toObject();
+}
+
+} // namespace zent::base
