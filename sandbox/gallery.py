@@ -12,7 +12,7 @@ import sys
 
 import roomclient
 from desktop import Desktop, stop
-from stage import (INTEGRITY_SIZE, LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE,
+from stage import (LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE,
                    RELEASE_LINK, RELEASE_SIZE, SPINNER_SIZE, Stage)
 
 BACKGROUNDS = {"light": "#8fa3b8", "dark": "#16202c"}
@@ -180,9 +180,7 @@ class Gallery(Stage):
 
     def integrity(self):
         """A failed device-integrity verification."""
-        self.call("/com/vantor/tarn/Fullzone", "com.vantor.tarn.Fullzone", "Notify", "关键文件被修改：/usr/bin/login",
-                  "/fix/page")
-        dialog = self.dialog(INTEGRITY_SIZE)
+        dialog = self.failed_verification("关键文件被修改：/usr/bin/login")
         self.shoot("integrity", dialog)
         self.keys(dialog, "Escape")
         self.gone(dialog)

@@ -53,3 +53,8 @@ class Stage:
     def call(self, path, interface, method, *arguments):
         subprocess.run(["gdbus", "call", "--session", "-d", SERVICE, "-o", path, "-m", f"{interface}.{method}",
                         *arguments], check=True, capture_output=True)
+
+    def failed_verification(self, text):
+        """The integrity dialog, after a verification has failed with this text."""
+        self.call("/com/vantor/tarn/Fullzone", "com.vantor.tarn.Fullzone", "Notify", text, "/fix/page")
+        return self.dialog(INTEGRITY_SIZE)

@@ -6,7 +6,7 @@ import subprocess
 import gallery
 import roomclient
 from faults import NO_NOTIFICATIONS
-from stage import (INTEGRITY_SIZE, LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE,
+from stage import (LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE,
                    RELEASE_LINK, RELEASE_SIZE, Stage)
 
 NOTIFICATION = ("/com/vantor/tarn/Notification", "com.vantor.tarn.Notification")
@@ -166,8 +166,7 @@ class Events(Stage):
 
     def integrity(self):
         """A verification fails; then it succeeds, or the user closes the dialog."""
-        self.call(*FULLZONE, "Notify", f"校验失败 {self.number}", "/fix/page")
-        dialog = self.dialog(INTEGRITY_SIZE)
+        dialog = self.failed_verification(f"校验失败 {self.number}")
         self.call(*FULLZONE, "Notify", "success", "false")
         self.gone(dialog)
 
