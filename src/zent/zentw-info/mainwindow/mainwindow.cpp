@@ -3,6 +3,7 @@
 #include "closeguarddialog.h"
 #include "dbusnames.h"
 #include "httprequest.h"
+#include "idcommand.h"
 #include "infowidget.h"
 #include "legacyqt.h"
 #include "loginname.h"
@@ -54,7 +55,7 @@ MainWindow::MainWindow(QWidget* parent, int osVersion)
     : ToolkitBlurFrame(parent),
       networkProxy(new NetworkDaemonProxy(zent::dbus::kNetworkService, zent::dbus::kNetworkPath,
                                           QDBusConnection::sessionBus(), this)),
-      osVersion(osVersion)
+      osVersion(osVersion), startedId(std::make_unique<IdCommand>())
 {
     initResources();
     policyTimer = std::make_unique<QTimer>();

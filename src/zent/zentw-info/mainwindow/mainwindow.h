@@ -11,6 +11,7 @@
 #include <functional>
 #include <memory>
 
+class IdCommand;
 class InfoWidget;
 class ModifyDialog;
 class NetworkDaemonProxy;
@@ -228,6 +229,8 @@ private:
     bool sceneBoxReady = false;
     QString scenceUserName;
     int osVersion;
+    /// The run of "id" that isAdminUser() waits for first, under way while the window is made.
+    std::unique_ptr<IdCommand> startedId;
     ToolkitTitlebar* titlebar = nullptr;
     InfoWidget* infoWidget = nullptr;
     bool movedByUser = false;

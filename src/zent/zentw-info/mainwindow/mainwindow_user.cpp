@@ -34,7 +34,8 @@ bool MainWindow::isScenceUser()
 
 bool MainWindow::isAdminUser()
 {
-    const QString output = idCommandOutput();
+    const auto command = startedId ? std::move(startedId) : std::make_unique<IdCommand>();
+    const QString output = command->output();
     return output.contains(QLatin1String("sudo")) && output.contains(QLatin1String("zent"));
 }
 

@@ -100,9 +100,9 @@ QNetworkRequest QNotification::makeRequest(const QUrl& url, const char* caller)
     version->apply(request);
     request.setRawHeader("X-XSRF-TOKEN", m_token.toUtf8());
     if (url.scheme() == QLatin1String("https")) {
-        if (m_ssl.isNull())
+        if (!m_ssl)
             m_ssl = platformSsl();
-        request.setSslConfiguration(m_ssl);
+        request.setSslConfiguration(*m_ssl);
     }
     return request;
 }

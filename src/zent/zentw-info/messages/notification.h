@@ -10,6 +10,7 @@
 #include <QUrl>
 
 #include <functional>
+#include <optional>
 
 class QNetworkAccessManager;
 class QNetworkReply;
@@ -90,5 +91,6 @@ private:
     QNetworkAccessManager* m_listManager = nullptr;
     QNetworkAccessManager* m_readManager = nullptr;
     QNetworkAccessManager* m_readAllManager = nullptr;
-    QSslConfiguration m_ssl;
+    /// Comes with the first request: making even an empty one loads OpenSSL.
+    std::optional<QSslConfiguration> m_ssl;
 };

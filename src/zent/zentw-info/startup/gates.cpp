@@ -21,7 +21,7 @@ bool isDomain()
 
 bool isLDAPUser()
 {
-    return idCommandOutput().contains(QLatin1String("zent"));
+    return IdCommand().output().contains(QLatin1String("zent"));
 }
 
 int getMiniVersion()

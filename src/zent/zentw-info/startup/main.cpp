@@ -1,4 +1,5 @@
 #include "gates.h"
+#include "heap.h"
 #include "log.h"
 #include "mainwindow.h"
 #include "screens.h"
@@ -17,6 +18,7 @@ constexpr int kOsVersion = 1020;
 
 int main(int argc, char* argv[])
 {
+    zent::boundHeap();
     zent::initLocale();
     zent::uOpenlog(zent::LEVEL_DEBUG);
     // Qt's bearer thread would otherwise wake up every ten seconds for as long as the client runs.
