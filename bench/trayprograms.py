@@ -71,6 +71,8 @@ def wait_answered():
 
 
 def measure_idle(desktop, probe, seconds, programs):
+    # Pages of a program that was built just now would count as written until they are on the disk.
+    os.sync()
     processes = {}
     for name, program in programs.items():
         processes[name] = desktop.spawn([program])

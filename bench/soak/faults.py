@@ -39,8 +39,7 @@ def http_faults():
         "refused": ({"status": 403, "body": "{}"}, HTTP),
         "error 500": ({"status": 500, "body": "<html>oops</html>"}, HTTP),
         "garbage": ({"status": 200, "body": GARBAGE}, HTTP),
-        # No larger: what the C library's heap keeps of megabytes that come and go would hide a leak.
-        "large": ({"status": 200, "body_bytes": 100_000}, HTTP),
+        "large": ({"status": 200, "body_bytes": 2_000_000}, HTTP),
         "slow": ({"delay_ms": 700}, "(?!)"),
         "dropped before the answer": ({"drop": "before"}, HTTP),
         "dropped in the answer": ({"drop": "mid"}, HTTP),

@@ -25,7 +25,7 @@ import roomclient  # noqa: E402
 from desktop import Desktop, stop  # noqa: E402
 
 from events import Events  # noqa: E402
-from faults import FAULTS, Faults  # noqa: E402
+from faults import FAULTS, NO_NOTIFICATIONS, Faults  # noqa: E402
 
 SAMPLE_S = 1
 MOST_GROWTH_KIB = 1024
@@ -56,9 +56,8 @@ class SoakDesktop(Desktop):
                 self.parts["dunst"] = self.processes[-1]
 
 
-# Memory in KiB: the proportional set size; that of the client's own pages; the resident pages of libraries and fonts,
-# which others may share.
-Sample = collections.namedtuple("Sample", "seconds pss own library files sockets threads")
+# Memory in KiB: the proportional set size; that of the client's own pages; what is in use of its heap.
+Sample = collections.namedtuple("Sample", "seconds pss own heap files sockets threads")
 
 
 class Sampler(threading.Thread):
@@ -80,10 +79,12 @@ class Sampler(threading.Thread):
 
     def _sample(self):
         rollup, status = (self._sizes(name) for name in ("smaps_rollup", "status"))
+        with open(os.path.join(roomclient.ROOM, "heap"), encoding="ascii") as stream:
+            heap = int(stream.read()) / 1024
         kinds = collections.Counter("socket" if self._is_socket(number) else "file"
                                     for number in os.listdir(f"{self.root}/fd"))
         return Sample(time.monotonic() - self.start_time, rollup["Pss"], rollup["Pss_Anon"] + rollup["Pss_Shmem"],
-                      status["RssFile"], kinds["file"], kinds["socket"], int(status["Threads"]))
+                      heap, kinds["file"], kinds["socket"], int(status["Threads"]))
 
     def _sizes(self, name):
         with open(f"{self.root}/{name}", encoding="utf-8") as stream:
@@ -171,10 +172,7 @@ class Soak:
         """(criterion, measured, limit, kept) of each."""
         last = self.options.minutes
         of_minute = self.sampler.of_minute
-        # Pages of files count whole: their share of the proportional set size changes whenever another process comes or
-        # goes that has the same library or font. This growth is never less than that which the client itself causes.
-        growth = sum(of_minute(column, last, statistics.median) - of_minute(column, 2, statistics.median)
-                     for column in ("own", "library"))
+        growth = of_minute("pss", last, statistics.median) - of_minute("pss", 2, statistics.median)
         files, sockets = ([of_minute(kind, minute, min) for minute in (2, last)] for kind in ("files", "sockets"))
         log = read_log(os.path.join(roomclient.ROOM, "client.err"))
         above = [text for _, level, text in log if level in LEVELS_ABOVE_WARNING]
@@ -184,7 +182,7 @@ class Soak:
         return [
             ("client alive, ends with 0 when told to", f"{'yes' if self.alive else 'no'}, {self.status}", "yes, 0",
              self.alive and self.status == 0),
-            ("memory (Pss with file pages counted whole), growth from minute 2 to the last", f"{growth:+.0f} KiB",
+            ("proportional set size, growth of the median from minute 2 to the last", f"{growth:+.0f} KiB",
              f"below {MOST_GROWTH_KIB} KiB", growth < MOST_GROWTH_KIB),
             ("open files, fewest in minute 2 and in the last", f"{files[0]}, {files[1]}", "no growth",
              files[1] <= files[0]),
@@ -204,14 +202,15 @@ class Soak:
             print(f"| {name} | {measured} | {limit} | {'kept' if kept else '**failed**'} |")
         median = statistics.median
         columns = [("Pss KiB, median", "pss", median), ("own pages KiB, median", "own", median),
-                   ("file pages KiB, median", "library", median), ("open files, fewest", "files", min),
+                   ("heap in use KiB, least", "heap", min), ("open files, fewest", "files", min),
                    ("open sockets, fewest", "sockets", min), ("threads, median", "threads", median)]
         print("\n| minute | " + " | ".join(title for title, *_ in columns) + " |\n" + "|---" * 7 + "|")
         for minute in range(1, self.options.minutes + 1):
             values = (self.sampler.of_minute(column, minute, choose) for _, column, choose in columns)
             print(f"| {minute} | " + " | ".join(f"{value:.0f}" for value in values) + " |")
+        kinds = {fault.name for fault in (*FAULTS, NO_NOTIFICATIONS)}
         held = len({fault.name for fault, _, _ in self.faults.history})
-        print(f"\n{len(self.faults.history)} faults, {held} of {len(FAULTS)} kinds; seed {self.options.seed}\n")
+        print(f"\n{len(self.faults.history)} faults, {held} of {len(kinds)} kinds; seed {self.options.seed}\n")
         print("| event | done | cut short by a fault |\n|---|---|---|")
         for event in self.events.all:
             print(f"| {event.__doc__.rstrip('.')} | {self.events.done[event.__name__]} "
