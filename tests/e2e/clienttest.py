@@ -77,10 +77,6 @@ class ClientTest(unittest.TestCase):
         self.desktop.click_icon()
         return self.desktop.wait("the panel", self.desktop.panel)
 
-    def status_of_start(self):
-        """The exit status of a start that declines to run."""
-        return self.desktop.start_client(CLIENT).wait(20)
-
     def messages(self):
         """The logged messages, without their heads."""
         return [re.sub(r"^.*?\]  (.*) $", r"\1", line) for line in roomclient.syslog_lines()]

@@ -33,6 +33,5 @@ class Registry:
         return GLib.Variant("b", bool(self.hosts))
 
 
-if __name__ == "__main__":
-    registry = Registry(Gio.bus_get_sync(Gio.BusType.SESSION))
-    GLib.MainLoop().run()
+registry = Registry(Gio.bus_get_sync(Gio.BusType.SESSION))
+GLib.MainLoop().run()
