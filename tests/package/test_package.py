@@ -85,17 +85,11 @@ class Package(ClientTest):
     def start_as_session(self):
         return self.desktop.spawn(session_command(AUTOSTART))
 
-    def check(self, *command):
-        result = subprocess.run(command, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False)
-        self.assertEqual((result.returncode, result.stdout), (0, result.stdout))
-
     def test_from_installation_to_purge(self):
         take_database()
         before = entries()
         self.assertNotIn("com.vantor.zent.lockdown", installed_schemas())
         dpkg("-i", os.environ["PACKAGE"])
-        self.check("desktop-file-validate", AUTOSTART, f"/usr/share/applications/{NAME}.desktop")
-        self.check("appstreamcli", "validate", "--pedantic", "--no-net", *glob.glob("/usr/share/metainfo/*zentw*"))
         self.assertIn("com.vantor.zent.lockdown", installed_schemas())
 
         self.assertEqual(shutil.which(NAME), f"/usr/bin/{NAME}")
