@@ -18,7 +18,7 @@ private slots:
 
     void userGate()
     {
-        const auto passes = [this](const char* output) {
+        const auto passes = [this](const QByteArray& output) {
             testfiles::write(m_room + "/standin/id.stdout", output);
             return isLDAPUser();
         };
@@ -27,6 +27,12 @@ private slots:
         // "id" ends with 1 when a group has no name, which is common with directory groups.
         testfiles::write(m_room + "/standin/id.rc", "1");
         QVERIFY(passes("uid=1(a) groups=9(zent)\n"));
+        // More than a pipe holds.
+        QVERIFY(passes(QByteArray(200000, ' ') + "zent\n"));
+        const QByteArray path = qgetenv("PATH");
+        qputenv("PATH", "/nowhere");
+        QVERIFY(!isLDAPUser());
+        qputenv("PATH", path);
     }
 
     void minorVersion()
