@@ -3,41 +3,28 @@
 #include "infowidget.h"
 #include "logcapture.h"
 #include "mainwindow.h"
+#include "noticedialog.h"
+#include "notification.h"
 #include "paths.h"
 #include "platformcontrol.h"
 #include "sessionhost.h"
 #include "testfiles.h"
-#include "testrows.h"
 
+#include <QApplication>
 #include <QComboBox>
 #include <QLabel>
-#include <QScreen>
+#include <QMessageBox>
+#include <QPlainTextEdit>
+#include <QPushButton>
 #include <QSignalSpy>
+#include <QtTest>
 
 namespace
 {
 
-const QString kUser = QStringLiteral("zhangsan");
-const QString kSceneFile = zent::kCurrentScenePath.arg(kUser);
-
-QByteArray scenesReply(const QStringList& names)
-{
-    QJsonArray scenes;
-    for (const QString& name : names)
-        scenes.append(QJsonObject{{"scene_name", name}, {"scene_code", "code-" + name}});
-    return QJsonDocument(QJsonObject{{"code", 0}, {"message", scenes}}).toJson();
-}
-
-QString userReply(int code, const QString& gecos)
-{
-    const QJsonObject user{{"gecos", gecos}, {"client_name", QStringLiteral("别名")}, {"id", 3}};
-    return QJsonDocument(QJsonObject{{"code", code}, {"data", QJsonObject{{"user", user}}}}).toJson();
-}
-
-QString organisation(int code)
-{
-    return QString(R"({"code": %1, "data": {"name": "公司"}})").arg(code);
-}
+const QString kSceneFile = zent::kCurrentScenePath.arg("zhangsan");
+const QString kListPath = QStringLiteral("/notification/v2/list");
+const QString kReadPath = QStringLiteral("/notification/v2/read");
 
 } // namespace
 
@@ -49,201 +36,127 @@ class TestMainWindow : public QObject
     std::unique_ptr<MainWindow> m_window;
 
     QString shown(const char* label) const { return m_window->findChild<QLabel*>(label)->text(); }
-    int analyseScenes(const QByteArray& reply)
+    void analyseScenes(const QStringList& names)
     {
-        QByteArray body = reply;
-        return m_window->analyseEvnData(&body);
+        QJsonArray scenes;
+        for (const QString& name : names)
+            scenes.append(QJsonObject{{"scene_name", name}, {"scene_code", "code-" + name}});
+        QByteArray body = QJsonDocument(QJsonObject{{"code", 0}, {"message", scenes}}).toJson();
+        QCOMPARE(m_window->analyseEvnData(&body), 1);
     }
     QComboBox* sceneBox() const { return m_window->findChild<QComboBox*>(); }
+    NoticeDialog* notice() const { return m_window->findChild<NoticeDialog*>(); }
+    QPushButton* first() const { return notice()->firstButton(); }
+    QPushButton* next() const { return notice()->nextButton(); }
+    QString shownTitle() const { return notice()->findChildren<QPlainTextEdit*>().first()->toPlainText(); }
+    QList<QJsonObject> requests(const QString& path)
+    {
+        QList<QJsonObject> result;
+        for (const QJsonObject& request : m_platform.record("http")) {
+            if (request.value("path") == path)
+                result.append(request);
+        }
+        return result;
+    }
+    void makeWindow(int unread)
+    {
+        m_platform.setUnread(unread);
+        MainWindow::unreadMessageCount = 0;
+        m_window = std::make_unique<MainWindow>(nullptr, 1020);
+    }
 
 private slots:
     void init()
     {
         m_platform.clearFaults();
         m_platform.clearRecord();
-        m_window = std::make_unique<MainWindow>(nullptr, 1020);
-        m_window->setWindowFlags(Qt::Tool | Qt::FramelessWindowHint);
+        makeWindow(0);
     }
     void cleanup() { m_window.reset(); }
-
-    void userReplyFillsTheLoginPage()
-    {
-        HttpRequest* client = HttpRequest::GetInstance();
-        client->onUserInfo(500, userReply(0, QStringLiteral("张三,x,,A1")));
-        QCOMPARE(shown("macValue") + shown("userRoleValue") + shown("terminalValue"), QStringLiteral("张三A1别名"));
-        LogCapture log;
-        for (const QString& bad : {userReply(1, QStringLiteral("李四")), QString("[]"), QString("nonsense"), QString()})
-            client->onUserInfo(200, bad);
-        QCOMPARE(log.count("analyseData getusrInfo failed! 200"), 4);
-        QCOMPARE(shown("macValue"), QStringLiteral("张三"));
-        client->onCompanyName(200, organisation(0));
-        client->onCompanyName(200, R"({"code": 0, "data": ["x"]})");
-        m_window->onLogininfoClicked();
-        QCOMPARE(shown("nameValue"), QStringLiteral("公司"));
-    }
 
     void pollingEndsWithTheFirstGoodAnswer()
     {
         for (const char* path : {"account", "uim_department/id"})
             m_platform.addFault({{"path", QString("/uim/v3/client/") + path}}, {{"body", R"({"code": 1})"}});
-        QSignalSpy users(HttpRequest::GetInstance(), &HttpRequest::sigUserInfo);
-        QSignalSpy organisations(HttpRequest::GetInstance(), &HttpRequest::sigCompanyName);
+        HttpRequest* client = HttpRequest::GetInstance();
+        QSignalSpy users(client, &HttpRequest::sigUserInfo);
+        QSignalSpy organisations(client, &HttpRequest::sigCompanyName);
         QTRY_VERIFY_WITH_TIMEOUT(users.count() >= 2, 20000);
-        HttpRequest::GetInstance()->onUserInfo(200, userReply(0, "A"));
+        // The body alone decides.
+        client->onUserInfo(500, R"({"code": 0, "data": {"user": {"gecos": "A,,,1", "client_name": "PC"}}})");
+        QCOMPARE(shown("macValue") + shown("userRoleValue") + shown("terminalValue"), QString("A1PC"));
         const int asked = users.count();
         // The other question, which is still open, is asked more rarely than this one was.
         const int before = organisations.count();
         QTRY_VERIFY_WITH_TIMEOUT(organisations.count() >= before + 2, 20000);
         QCOMPARE(users.count(), asked);
-        emit m_window->startgetMeInfo();
-        QCOMPARE(users.count(), asked + 1);
     }
 
-    void networkPage_data()
-    {
-        addColumns<QJsonObject, QString>("fault", "fields");
-        const QString three = R"([{"IsPrimaryConnection": false, "HwAddress": "no"}, {"IsPrimaryConnection": true,
-            "HwAddress": "m", "Speed": "s", "Ip4": {"Address": "a", "Mask": "k", "Gateways": [], "Dnses": []}}, {}])";
-        addRow("second primary", QJsonObject{{"value", three}}, "m|a|||k|s");
-        addRow("none primary", QJsonObject{{"value", "[{}]"}}, "|||||");
-        addRow("object", QJsonObject{{"value", "{}"}}, "old");
-        addRow("not json", QJsonObject{{"value", "["}}, "old");
-        addRow("error", QJsonObject{{"error", "com.vantor.Error.Failed"}}, "old");
-        addRow("no value", QJsonObject{{"no_value", true}}, "old");
-        addRow("vanishes", QJsonObject{{"vanish", true}}, "old");
-        addRow("hangs until it ends", QJsonObject{{"vanish", true}, {"delay_ms", 500}}, "old");
-        addRow("absent", QJsonObject(), "old");
-        addRow("a number", QJsonObject{{"value", 7}, {"signature", "i"}}, "old");
-        addRow("odd types", QJsonObject{{"value", R"([{"IsPrimaryConnection": true, "Speed": 7}])"}}, "old");
-    }
     void networkPage()
     {
-        QFETCH(QJsonObject, fault);
-        QFETCH(QString, fields);
         const auto page = [this] {
             QStringList texts;
-            for (const char* label : {"netspeedValue", "subnetmaskValue", "dnsValeu", "ipV4GatewayValue", "ipv4Value"})
-                texts.prepend(shown(label));
-            for (const QLabel* label : m_window->findChildren<QLabel*>("macValue"))
-                if (label->parent()->findChild<QLabel*>("netspeedValue"))
-                    texts.prepend(label->text());
+            for (const char* label : {"ipv4Value", "ipV4GatewayValue", "dnsValeu", "subnetmaskValue", "netspeedValue"})
+                texts.append(shown(label));
             return texts.join('|');
         };
-        m_platform.patchState({{"services", QJsonObject{{"network", true}}}});
-        m_window->onNetinfoClicked();
         const QString before = page();
-        QCOMPARE(before.count('|'), 5);
-        if (fault.isEmpty())
-            m_platform.patchState({{"services", QJsonObject{{"network", false}}}});
-        m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}}, fault);
-        LogCapture log;
-        m_window->onNetinfoClicked();
-        QCOMPARE(page(), fields == "old" ? before : fields);
-        QCOMPARE(log.contains("GetActiveConnectionInfo"), fields == "old");
-        m_platform.patchState({{"services", QJsonObject{{"network", false}}}});
-        m_platform.patchState({{"services", QJsonObject{{"network", true}}}});
+        QVERIFY(before.contains("10.20.30.1"));
+        const QJsonObject faults[] = {{{"value", 7}, {"signature", "i"}},
+                                      {{"error", "com.vantor.Error.Failed"}},
+                                      {{"vanish", true}, {"delay_ms", 500}},
+                                      {{"value", "[{}]"}}};
+        for (const QJsonObject& fault : faults) {
+            m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}}, fault);
+            LogCapture log;
+            m_window->onNetinfoClicked();
+            const bool answers = fault.value("value").isString();
+            QCOMPARE(page(), answers ? "||||" : before);
+            QCOMPARE(log.contains("GetActiveConnectionInfo"), !answers);
+            m_platform.patchState({{"services", QJsonObject{{"network", true}}}});
+        }
     }
 
-    void severalScenesAreOfferedAndSwitched()
+    void scenesAreSwitched()
     {
-        QCOMPARE(testfiles::read(kSceneFile), QByteArray("intranet-scene"));
-        const QRect area = QGuiApplication::primaryScreen()->availableGeometry();
-        m_window->move(area.width() - m_window->width(), area.height() - m_window->height());
+        // One scene alone is no choice.
+        analyseScenes({"甲"});
+        QVERIFY(sceneBox()->isHidden());
         const QPoint corner = m_window->geometry().bottomRight();
-        const int height = m_window->height();
-        QCOMPARE(analyseScenes(scenesReply({"甲", "乙", "丙"})), 1);
+        analyseScenes({"乙", "丙", "丁"});
         QCOMPARE(sceneBox()->count(), 3);
-        QCOMPARE(sceneBox()->currentIndex(), 0);
-        QCOMPARE(m_window->height(), height + 515 - 469);
         QCOMPARE(m_window->geometry().bottomRight(), corner);
-        // Filling the box is not a choice.
+        // Filling the box is not a choice either.
         QCOMPARE(testfiles::read(kSceneFile), QByteArray("intranet-scene"));
         sceneBox()->setCurrentIndex(1);
-        QCOMPARE(testfiles::read(kSceneFile), QByteArray("code-乙"));
-
+        QCOMPARE(testfiles::read(kSceneFile), QByteArray("code-丙"));
         // A second reply adds its scenes and selects nothing.
-        QCOMPARE(analyseScenes(scenesReply({"甲", "丁"})), 1);
+        analyseScenes({"甲", "戊"});
         QCOMPARE(sceneBox()->count(), 5);
         QCOMPARE(sceneBox()->currentIndex(), 1);
-        LogCapture log;
-        sceneBox()->setCurrentIndex(4);
-        QCOMPARE(testfiles::read(kSceneFile), QByteArray("code-丁"));
-        QCOMPARE(log.count("Switch to scene : "), 1);
-    }
-
-    void goingBackLeavesTheFileAlone()
-    {
-        analyseScenes(scenesReply({"甲", "乙"}));
+        // Nor is going back.
         {
             const QSignalBlocker blocker(m_window->findChild<InfoWidget*>());
-            sceneBox()->setCurrentIndex(1);
+            sceneBox()->setCurrentIndex(0);
         }
         testfiles::write(kSceneFile, "untouched");
         m_window->reverseEvn();
-        QCOMPARE(sceneBox()->currentIndex(), 0);
         QCOMPARE(testfiles::read(kSceneFile), QByteArray("untouched"));
-    }
-
-    void repliesWithoutAChoice()
-    {
-        QCOMPARE(analyseScenes("<html>"), 0);
-        for (const QByteArray& body : {QByteArray(R"({"code": 1})"), QByteArray("[]"), scenesReply({})})
-            QCOMPARE(analyseScenes(body), 1);
-        m_window->switchUserEvn();
-        QCOMPARE(m_window->getEvncode("甲"), -1);
-        QCOMPARE(analyseScenes(scenesReply({"甲"})), 1);
-        QCOMPARE(m_window->getEvncode("甲"), 0);
-        QVERIFY(sceneBox()->isHidden());
-        QCOMPARE(sceneBox()->count(), 0);
     }
 
     void scenesAreAskedOnceAfterTheOrganisation()
     {
         testfiles::write(zent::kMachineidPath, "id&1\n");
-        m_window = std::make_unique<MainWindow>(nullptr, 1020);
+        makeWindow(0);
         SessionHost host(*m_window);
         m_platform.clearRecord();
         for (int code : {1, 0, 0})
-            HttpRequest::GetInstance()->onCompanyName(200, organisation(code));
+            HttpRequest::GetInstance()->onCompanyName(200, QString(R"({"code": %1, "data": {}})").arg(code));
         QTRY_COMPARE(sceneBox()->count(), 3);
-        QList<QJsonObject> asked;
-        for (const QJsonObject& request : m_platform.record("http")) {
-            if (request.value("path") == "/api/client/area/scenes")
-                asked.append(request);
-        }
+        const QList<QJsonObject> asked = requests("/api/client/area/scenes");
         QCOMPARE(asked.size(), 1);
         QCOMPARE(asked.first().value("scheme").toString(), QStringLiteral("http"));
-        QCOMPARE(asked.first().value("raw_query").toString(), "machine_id=id%261%0A&username=" + kUser);
-        QCOMPARE(asked.first().value("headers").toObject().value("x-lumo-version").toString(), QStringLiteral("v2"));
-    }
-
-    void areaReplies()
-    {
-        const auto analyse = [this](QByteArray body) { return m_window->analyseAreaData(&body); };
-        QCOMPARE(analyse(R"({"code": 0, "data": [{"name": "区域"}]})"), 1);
-        QTRY_COMPARE(sceneBox()->count(), 3);
-        QCOMPARE(analyse(R"({"code": 0, "data": []})"), 1);
-        QCOMPARE(analyse("{"), 0);
-        m_window->onLogininfoClicked();
-        QCOMPARE(shown("nameValue"), QStringLiteral("区域"));
-    }
-
-    void randomIntervals()
-    {
-        for (const auto& [upper, lower] : {std::pair{60000, 30000}, {180000, 60000}, {3000, 1000}, {5, 5}}) {
-            const int value = m_window->generateRandnum(upper, lower);
-            QVERIFY(value >= lower && (value < upper || upper == lower));
-        }
-    }
-
-    void shellCommands()
-    {
-        QCOMPARE(m_window->system(QString()), -1);
-        QCOMPARE(m_window->system("printf 'a\\nb'; exit 3"), 0);
-        QCOMPARE(m_window->commandOutputLines(), QList<QString>({"a\n", "b"}));
-        QCOMPARE(m_window->system("head -c 300 /dev/zero | tr '\\0' x"), 0);
-        QCOMPARE(m_window->commandOutputLines().size(), 5);
-        QCOMPARE(m_window->commandOutputLines().at(2).size(), 127);
+        QCOMPARE(asked.first().value("raw_query").toString(), QString("machine_id=id%261%0A&username=zhangsan"));
     }
 
     void administrators()
@@ -255,6 +168,99 @@ private slots:
             QCOMPARE(window.findChild<QWidget*>("closeGuard") != nullptr, QString(groups).contains(','));
         }
         QFile::remove(file);
+    }
+
+    void countIsAnnouncedOncePerChange()
+    {
+        m_platform.setUnread(2);
+        QSignalSpy spy(m_window.get(), &MainWindow::newMessage);
+        for (const bool fails : {false, false, true}) {
+            if (fails)
+                m_platform.addFault({{"path", kListPath}}, {{"status", 500}});
+            // A new second: polls within one second share their URL and thus their callback.
+            const QString second = QTime::currentTime().toString();
+            QTRY_VERIFY(QTime::currentTime().toString() != second);
+            m_window->unreadMessages();
+            QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
+            QCOMPARE(spy.count(), 1);
+        }
+        const QJsonObject request = requests(kListPath).last();
+        QVERIFY(request.value("raw_query").toString().startsWith("uid=zhangsan&is_not_read=1&limit=1&offset=0&"));
+        QCOMPARE(request.value("headers").toObject().value("x-xsrf-token"), m_platform.state().value("token"));
+        for (const int left : {1, 0, 0}) {
+            m_window->onReadListMessage("x");
+            QCOMPARE(MainWindow::unreadMessageCount, left);
+        }
+    }
+
+    void oneMessageIsMarkedReadOnce()
+    {
+        makeWindow(1);
+        m_window->openNotice();
+        QTRY_VERIFY(notice()->isVisible());
+        QCOMPARE(first()->text(), QStringLiteral("已读"));
+        QVERIFY(next()->isHidden());
+        QSignalSpy read(m_window.get(), &MainWindow::readNotify);
+        first()->click();
+        first()->click();
+        QTRY_COMPARE(read, QList<QVariantList>{{"0"}});
+        QCOMPARE(requests(kReadPath).size(), 1);
+        QTRY_COMPARE(first()->text(), QStringLiteral("关闭"));
+        QTRY_VERIFY(!first()->signalsBlocked());
+        first()->click();
+        QVERIFY(notice()->isHidden());
+    }
+
+    void severalMessagesAreSteppedThrough()
+    {
+        makeWindow(120);
+        m_window->openNotice();
+        QTRY_VERIFY(notice()->isVisible());
+        QCOMPARE(first()->text() + next()->text(), QStringLiteral("关闭下一条(...)"));
+        m_platform.setUnread(3);
+        m_window->openNotice();
+        QTRY_COMPARE(next()->text(), QStringLiteral("下一条(3)"));
+        QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 2 %2"));
+        next()->click();
+        QVERIFY(!next()->isEnabled());
+        QTRY_COMPARE(next()->text(), QStringLiteral("下一条(2)"));
+        QVERIFY(next()->isEnabled());
+        QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 1 %2"));
+
+        QSignalSpy read(m_window.get(), &MainWindow::readNotify);
+        m_platform.addFault({{"path", "/notification/v2/*"}}, {{"status", 500}});
+        QStringList warnings;
+        QTimer closing;
+        connect(&closing, &QTimer::timeout, this, [&warnings] {
+            if (auto* box = qobject_cast<QMessageBox*>(QApplication::activeModalWidget())) {
+                warnings.append(box->windowTitle());
+                box->close();
+            }
+        });
+        closing.start(5);
+        // The request is under way when this returns.
+        m_window->openNotice();
+        next()->click();
+        QTRY_COMPARE(warnings, QStringList("消息调用警告"));
+        QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
+        QVERIFY(read.isEmpty() && !next()->isEnabled());
+        QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 1 %2"));
+        m_platform.clearFaults();
+        m_window->onReadListMessage("other");
+        QTRY_VERIFY(next()->isEnabled());
+    }
+
+    void windowMayGoAtAnyTime()
+    {
+        makeWindow(1);
+        QTimer::singleShot(100, this, [this] { m_window.reset(); });
+        m_window->openNotice();
+        QVERIFY(!m_window);
+        m_platform.addFault({{"path", kListPath}}, {{"delay_ms", 300}});
+        makeWindow(1);
+        m_window->unreadMessages();
+        m_window.reset();
+        QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
     }
 };
 
