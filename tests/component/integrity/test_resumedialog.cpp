@@ -1,7 +1,6 @@
 #include "processrecord.h"
 #include "resumedialog.h"
 
-#include <QSignalSpy>
 #include <QTimer>
 #include <QtTest>
 

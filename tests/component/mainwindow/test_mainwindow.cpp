@@ -1,8 +1,9 @@
-#include "fileconfig.h"
+#include "dbusnames.h"
 #include "httprequest.h"
 #include "infowidget.h"
 #include "logcapture.h"
 #include "mainwindow.h"
+#include "networkdaemonproxy.h"
 #include "noticedialog.h"
 #include "notification.h"
 #include "paths.h"
@@ -114,6 +115,20 @@ private slots:
             QCOMPARE(page(), answers ? "||||" : before);
             QCOMPARE(log.contains("GetActiveConnectionInfo"), !answers);
             m_platform.patchState({{"services", QJsonObject{{"network", true}}}});
+        }
+    }
+
+    void hangingNetworkDaemonCostsOneTimeOut()
+    {
+        NetworkDaemonProxy daemon(zent::dbus::kNetworkService, zent::dbus::kNetworkPath, QDBusConnection::sessionBus());
+        daemon.setTimeout(1500);
+        // A failure that comes at once does not keep it from being asked.
+        const QPair<QJsonObject, int> faults[] = {{{{"error", "com.vantor.Error.Failed"}}, 2}, {{{"hang", true}}, 1}};
+        for (const auto& [action, asked] : faults) {
+            m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}}, action);
+            m_platform.clearRecord();
+            QVERIFY(!daemon.activeConnectionInfo() && !daemon.activeConnectionInfo());
+            QCOMPARE(m_platform.record("dbus").size(), asked);
         }
     }
 

@@ -148,10 +148,7 @@ private slots:
                 m_notifier->notify("<i>", "<a>", "&amp;\n2");
             QTRY_COMPARE(m_server->shown.size(), 3);
             QCOMPARE(m_server->asked, 1);
-            const QStringList actions{"default", QStringLiteral("查看")};
-            const QVariantMap hints{{"desktop-entry", "zentw-info"}};
-            QCOMPARE(m_server->shown.first(),
-                     QVariantList({QStringLiteral("域管平台"), 0U, "zentw-info", title, body, actions, hints, -1}));
+            QCOMPARE(m_server->shown.first().mid(3, 2), QVariantList({title, body}));
         }
     }
 
@@ -228,15 +225,6 @@ private slots:
         QCOMPARE(m_server->asked, 0);
 
         showOne();
-        const uint former = m_server->lastId;
-        startServer();
-        settle();
-        // Numbers begin anew, so the former service's mean nothing now.
-        emit m_server->ActionInvoked(former, "default");
-        settle();
-        QCOMPARE(m_activated->size(), 0);
-        showOne();
-        QCOMPARE(m_server->asked, 1);
         QCOMPARE(m_unavailable->size(), 1);
     }
 };
