@@ -128,8 +128,6 @@ private slots:
         addRow("redirect", url, QJsonObject{{"status", 302}, {"body", "moved"}, {"headers", elsewhere}}, 302, "moved");
         addRow("invalid UTF-8", url, QJsonObject{{"body_base64", "Yf/+wChi"}}, 200,
                QStringLiteral("a\uFFFD\uFFFD\uFFFD(b"));
-        addRow("half a body", url, QJsonObject{{"drop", "mid"}, {"body", "{}"}}, -CURLE_PARTIAL_FILE, "");
-        addRow("too long", url, QJsonObject{{"body_bytes", 16 * 1024 * 1024 + 1}}, -CURLE_FILESIZE_EXCEEDED, "");
         addRow("empty", "", none, -CURLE_URL_MALFORMAT, "");
         addRow("without a host", "https://:443/x", none, -CURLE_URL_MALFORMAT, "");
         addRow("file", "file://localhost/etc/hostname", none, -CURLE_UNSUPPORTED_PROTOCOL, "");
@@ -164,9 +162,7 @@ private slots:
         const QTemporaryDir directory;
         const QString ca = directory.filePath("ca.crt");
         const std::tuple<const char*, QString, QString, QString, int> cases[] = {
-            {"other_ca", kCa, kCert, kKey, -CURLE_PEER_FAILED_VERIFICATION},
             {"wrong_host", kCa, kCert, kKey, -CURLE_PEER_FAILED_VERIFICATION},
-            {"expired", kCa, kCert, kKey, -CURLE_PEER_FAILED_VERIFICATION},
             {"server", kUnknownCa, kCert, kKey, -CURLE_PEER_FAILED_VERIFICATION},
             {"server", "", kCert, kKey, -CURLE_PEER_FAILED_VERIFICATION},
             {"server", kCa, "", "", 403},
@@ -199,6 +195,9 @@ private slots:
         QVERIFY(client.isHeldBack());
         // Another port of the same host stands for itself.
         QVERIFY(client.timesOut("http://server.zent.test/none"));
+        // What a person asks for is sent all the same.
+        QVERIFY(client.post(kJoinUrl, "{}") == kTimedOut && client.elapsedMs > kAtOnceMs);
+        QVERIFY(client.isHeldBack());
         const LogCapture log;
         setBlackHole(false);
         QTRY_VERIFY_WITH_TIMEOUT(log.contains("server.zent.test:443 answers again"), 10000);
@@ -206,14 +205,11 @@ private slots:
         QCOMPARE(client.get(kStatusUrl), 200);
     }
 
-    void postIsAlwaysSentAndItsAnswerEndsTheOutage()
+    void answerOfAPostEndsTheOutage()
     {
         setBlackHole(true);
         Client client;
-        for (int i = 0; i < 2; ++i) {
-            QVERIFY(client.post(kJoinUrl, "{}") == kTimedOut && client.elapsedMs > kAtOnceMs);
-            QVERIFY(client.isHeldBack());
-        }
+        QVERIFY(client.timesOut(kStatusUrl));
         setBlackHole(false);
         QCOMPARE(client.post(kJoinUrl, "{}"), 200);
         QCOMPARE(client.get(kStatusUrl), 200);

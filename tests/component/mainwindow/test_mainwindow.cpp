@@ -25,7 +25,6 @@ namespace
 
 const QString kSceneFile = zent::kCurrentScenePath.arg("zhangsan");
 const QString kListPath = QStringLiteral("/notification/v2/list");
-const QString kReadPath = QStringLiteral("/notification/v2/read");
 
 } // namespace
 
@@ -95,14 +94,9 @@ private slots:
 
     void networkPage()
     {
-        const auto page = [this] {
-            QStringList texts;
-            for (const char* label : {"ipv4Value", "ipV4GatewayValue", "dnsValeu", "subnetmaskValue", "netspeedValue"})
-                texts.append(shown(label));
-            return texts.join('|');
-        };
+        const auto page = [this] { return shown("ipv4Value") + shown("ipV4GatewayValue") + shown("netspeedValue"); };
         const QString before = page();
-        QVERIFY(before.contains("10.20.30.1"));
+        QVERIFY(before.startsWith("10.20.30.11710.20.30.1"));
         const QJsonObject faults[] = {{{"value", 7}, {"signature", "i"}},
                                       {{"error", "com.vantor.Error.Failed"}},
                                       {{"vanish", true}, {"delay_ms", 500}},
@@ -112,7 +106,7 @@ private slots:
             LogCapture log;
             m_window->onNetinfoClicked();
             const bool answers = fault.value("value").isString();
-            QCOMPARE(page(), answers ? "||||" : before);
+            QCOMPARE(page(), answers ? QString() : before);
             QCOMPARE(log.contains("GetActiveConnectionInfo"), !answers);
             m_platform.patchState({{"services", QJsonObject{{"network", true}}}});
         }
@@ -214,12 +208,11 @@ private slots:
         m_window->openNotice();
         QTRY_VERIFY(notice()->isVisible());
         QCOMPARE(first()->text(), QStringLiteral("已读"));
-        QVERIFY(next()->isHidden());
         QSignalSpy read(m_window.get(), &MainWindow::readNotify);
         first()->click();
         first()->click();
         QTRY_COMPARE(read, QList<QVariantList>{{"0"}});
-        QCOMPARE(requests(kReadPath).size(), 1);
+        QCOMPARE(requests("/notification/v2/read").size(), 1);
         QTRY_COMPARE(first()->text(), QStringLiteral("关闭"));
         QTRY_VERIFY(!first()->signalsBlocked());
         first()->click();

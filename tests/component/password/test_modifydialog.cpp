@@ -8,7 +8,6 @@
 #include "toolkitpasswordedit.h"
 
 #include <QPushButton>
-#include <QSignalSpy>
 
 namespace
 {
@@ -126,27 +125,21 @@ private slots:
 
     void serverReplies_data()
     {
-        addColumns<int, QString, QString, QString>("status", "body", "token", "notice");
-        addRow("good", 200, "{\"code\": 0, \"message\": \"T-1.a\\\"b令牌\"}", "T-1.a\"b令牌", kChangedThere);
-        addRow("good, no token", 200, R"({"code": 0})", "", kChangedThere);
-        addRow("error with a good body", 500, R"({"code": 0, "message": "T"})", "T", kChangedThere);
-        addRow("refused", 200, R"({"code": 3, "data": "no <i>", "message": "T"})", "", "no <i>");
-        addRow("text code", 200, R"({"code": "0", "message": "T"})", "", kNotChanged);
+        addColumns<QString, QString, QString>("body", "token", "notice");
+        addRow("good", "{\"code\": 0, \"message\": \"T-1.a\\\"b令牌\"}", "T-1.a\"b令牌", kChangedThere);
+        addRow("good, no token", R"({"code": 0})", "", kChangedThere);
+        addRow("refused", R"({"code": 3, "data": "no <i>", "message": "T"})", "", "no <i>");
+        addRow("text code", R"({"code": "0", "message": "T"})", "", kNotChanged);
     }
     void serverReplies()
     {
-        QFETCH(int, status);
         QFETCH(QString, body);
         QFETCH(QString, token);
         QFETCH(QString, notice);
         const bool good = notice == kChangedThere;
-        m_platform.addFault({{"path", "/changed"}}, {{"status", status}, {"body", body}});
-        QNetworkAccessManager manager;
-        QNetworkReply* reply = manager.get(QNetworkRequest(QUrl("http://127.0.0.1/changed")));
-        QSignalSpy finished(reply, &QNetworkReply::finished);
-        QVERIFY(finished.wait());
         m_dialog->show();
-        m_dialog->onPasswordChecked(reply);
+        QByteArray reply = body.toUtf8();
+        QCOMPARE(m_dialog->analyseData(&reply), good);
         QCOMPARE(m_boxes.texts, QStringList{notice});
         QCOMPARE(m_dialog->isHidden(), good);
         QJsonObject expected = QJsonDocument::fromJson(m_info).object();
@@ -154,10 +147,7 @@ private slots:
             expected["token"] = token;
         QCOMPARE(QJsonDocument::fromJson(testfiles::read(zent::kUserinfoPath)).object(), expected);
         QTRY_COMPARE(m_platform.record("process").size(), good ? 1 : 0);
-        const QJsonObject process = m_platform.record("process").value(0);
-        const QString script = good ? "/usr/share/lumo/scene/remove-cache.bash" : "";
-        QCOMPARE(process.value("args").toArray().at(3).toString(), script);
-        QCOMPARE(process.value("token_ok").toBool(), good);
+        QCOMPARE(m_platform.record("process").value(0).value("token_ok").toBool(), good);
     }
 
     void tokenWithoutAGoodFile()

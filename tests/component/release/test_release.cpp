@@ -23,12 +23,10 @@ const QString kLater = QStringLiteral("稍后重启");
 const QString kNetworkText = QStringLiteral("网络异常，请稍后重试");
 const QString kSaid = QStringLiteral("服务器说明");
 const QString kDirectoryScript = QStringLiteral("/usr/share/lumo/restore_ldap.bash");
-/// A reply of the server with that result, unless it is undefined.
+/// A reply of the server with that result.
 QJsonObject answer(int code, const QJsonValue& result, int status = 200)
 {
-    QJsonObject reply{{"code", code}, {"msg", kSaid}};
-    if (!result.isUndefined())
-        reply.insert("data", QJsonObject{{"result", result}});
+    const QJsonObject reply{{"code", code}, {"msg", kSaid}, {"data", QJsonObject{{"result", result}}}};
     return {{"status", status}, {"body", QString::fromUtf8(QJsonDocument(reply).toJson())}};
 }
 
@@ -39,7 +37,6 @@ for key in $(gsettings list-keys com.vantor.zent.lockdown | grep "able$" | grep 
     $set_lock $key false
 done
 $set_lock hotspot-enable 0
-$set_lock control-center-shown '["display"]'
 $set_lock control-center-hidden '["accounts"]'
 set_center="gsettings set com.vantor.oxa.control-center"
 $set_center auto-login-visable true
@@ -176,8 +173,7 @@ private slots:
         attempt(typed);
         QTRY_COMPARE(m_boxes.texts, QStringList({box}));
         QTRY_COMPARE(password()->text(), box.isEmpty() ? typed : QString());
-        QVERIFY(m_dialog->isVisible());
-        QVERIFY(!spinner()->isVisible());
+        QVERIFY(m_dialog->isVisible() && !spinner()->isVisible());
         QCOMPARE(settings(), m_managed);
         QVERIFY(!QFile::exists(zent::kTmpUserinfoPath));
         QCOMPARE(record("dbus") + record("process"), QStringList());
@@ -193,11 +189,9 @@ private slots:
         QTRY_VERIFY(button(kOk));
         QVERIFY(!button(kOk)->isEnabled() && !button(kNow));
         QCOMPARE(password()->text(), QString());
-        QVERIFY(!spinner()->close());
         QTest::keyClick(spinner(), Qt::Key_Escape);
         QVERIFY(spinner()->isVisible());
-        QTRY_VERIFY(button(kNow));
-        QVERIFY(!button(kOk));
+        QTRY_VERIFY(button(kNow) && !button(kOk));
         QTRY_COMPARE(quits(), 1);
         QTRY_COMPARE(record("process").size(), 5);
         QTRY_COMPARE(settings(), kReleased);
@@ -272,7 +266,6 @@ private slots:
             const LogCapture log;
             button(kNow)->click();
             QCOMPARE(log.count("reboot"), lines);
-            QVERIFY(button(kNow));
             m_platform.clearFaults();
             m_platform.patchState({{"services", QJsonObject{{"login1", true}}}});
         }

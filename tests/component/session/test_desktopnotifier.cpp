@@ -6,7 +6,6 @@
 #include <QDBusContext>
 #include <QDBusMessage>
 #include <QDBusServiceWatcher>
-#include <QElapsedTimer>
 #include <QSignalSpy>
 
 #include <memory>
@@ -130,8 +129,6 @@ private slots:
     void cleanup()
     {
         m_notifier.reset();
-        if (!m_server)
-            return;
         m_server.reset();
         settle();
     }
@@ -217,11 +214,9 @@ private slots:
         m_server->instead = "hang";
         m_notifier->notify("t", "", "x");
         QTRY_COMPARE(m_server->asked, 1);
-        QElapsedTimer clock;
-        clock.start();
         startServer({"body"});
-        QTRY_COMPARE(m_unavailable->size(), 1);
-        QVERIFY2(clock.elapsed() < 4000, "must be noticed before the question's own time-out");
+        // Noticed before the question's own time-out.
+        QTRY_COMPARE_WITH_TIMEOUT(m_unavailable->size(), 1, 4000);
         QCOMPARE(m_server->asked, 0);
 
         showOne();
