@@ -31,13 +31,13 @@ public:
     }
     void clearFaults() { call("DELETE", "faults"); }
     /// Leaves the user that many unread messages with the uuids "0", "1", ..., each a minute younger than the former.
-    void setUnread(int count, const QString& user = QStringLiteral("zhangsan"))
+    void setUnread(int count)
     {
         const QDateTime start(QDate(2026, 11, 24), QTime(), Qt::UTC);
         QJsonArray messages;
         for (int i = 0; i < count; ++i)
             messages.append(QJsonObject{{"uuid", QString::number(i)},
-                                        {"uid", user},
+                                        {"uid", "zhangsan"},
                                         {"send_uid", QStringLiteral("<b>管理员</b>")},
                                         {"title", QStringLiteral("<i>通知</i> %1 %2").arg(i)},
                                         {"content", "text"},
