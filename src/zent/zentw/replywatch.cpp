@@ -3,7 +3,10 @@
 #include "replylimit.h"
 
 #include <QDebug>
+#include <QNetworkAccessManager>
 #include <QNetworkReply>
+
+#include <algorithm>
 
 namespace zent
 {
@@ -34,6 +37,27 @@ QString reasonOf(const QNetworkReply* reply)
     return answered ? QStringLiteral("status %1").arg(statusOf(reply)) : reply->errorString();
 }
 
+/// Whether the connection broke, or never came about, as opposed to an answer that tells of an error.
+bool connectionFailed(const QNetworkReply* reply)
+{
+    return reply->error() != QNetworkReply::NoError && reply->error() < QNetworkReply::ContentAccessDenied;
+}
+
+/// Has the manager forget its connections, unless one is in use. Qt otherwise goes on with the broken one, and of every
+/// TLS session that it then starts on it it keeps the one before, some 13 KiB.
+void dropConnections(QNetworkAccessManager* manager)
+{
+    // Later: the reply that failed is still being finished.
+    QMetaObject::invokeMethod(
+        manager,
+        [manager] {
+            const QList<QNetworkReply*> replies = manager->findChildren<QNetworkReply*>();
+            if (std::all_of(replies.begin(), replies.end(), [](auto* reply) { return reply->isFinished(); }))
+                manager->clearConnectionCache();
+        },
+        Qt::QueuedConnection);
+}
+
 } // namespace
 
 void watchReply(QNetworkReply* reply)
@@ -50,6 +74,8 @@ void watchReply(QNetworkReply* reply)
             return;
         qWarning() << methodOf(reply) << reply->url().toString(QUrl::RemoveQuery | QUrl::RemoveUserInfo)
                    << "failed:" << qPrintable(reasonOf(reply));
+        if (connectionFailed(reply))
+            dropConnections(reply->manager());
     });
 }
 
