@@ -146,6 +146,7 @@ class Soak:
             # Everything once, so that what is made on first use is there when the second minute begins.
             for event in self.events.all:
                 self.events.one(event)
+            self.faults.warm_up()
             self.faults.start()
             self._go_on()
             self.faults.stop()
@@ -178,7 +179,10 @@ class Soak:
         # than what the client itself adds to its proportional set size.
         growth = sum(of_minute(column, last, statistics.median) - of_minute(column, 2, statistics.median)
                      for column in ("own", "library"))
-        files, sockets = ([of_minute(kind, minute, min) for minute in (2, last)] for kind in ("files", "sockets"))
+        # Qt's HTTP thread, which has a file of its own, comes and goes with the connections: a minute may be without it.
+        half = (last + 1) // 2
+        files, sockets = ([min(of_minute(kind, minute, min) for minute in part)
+                           for part in (range(2, half + 1), range(half + 1, last + 1))] for kind in ("files", "sockets"))
         log = read_log(os.path.join(roomclient.ROOM, "client.err"))
         above = [text for _, level, text in log if level in LEVELS_ABOVE_WARNING]
         warnings = [(moment, text) for moment, level, text in log if level in ("warning", "")]
@@ -189,9 +193,9 @@ class Soak:
              self.alive and self.status == 0),
             ("memory (Pss with file pages counted whole), growth from minute 2 to the last", f"{growth:+.0f} KiB",
              f"below {MOST_GROWTH_KIB} KiB", growth < MOST_GROWTH_KIB),
-            ("open files, fewest in minute 2 and in the last", f"{files[0]}, {files[1]}", "no growth",
+            ("open files, fewest in the first half after minute 1 and in the second", f"{files[0]}, {files[1]}", "no growth",
              files[1] <= files[0]),
-            ("open sockets, fewest in minute 2 and in the last", f"{sockets[0]}, {sockets[1]}", "no growth",
+            ("open sockets, the same", f"{sockets[0]}, {sockets[1]}", "no growth",
              sockets[1] <= sockets[0]),
             ("log lines above warning", str(len(above)), "0", not above),
             ("warnings that no fault explains", f"{len(self.unexplained) - len(above)} of {len(warnings)}", "0",

@@ -5,8 +5,10 @@
 #include <QDebug>
 #include <QNetworkAccessManager>
 #include <QNetworkReply>
+#include <QTimer>
 
 #include <algorithm>
+#include <malloc.h>
 
 namespace zent
 {
@@ -16,6 +18,8 @@ namespace
 
 constexpr int kHttpOk = 200;
 constexpr int kFirstErrorStatus = 400;
+constexpr qint64 kLargeBytes = 256 * 1024;
+constexpr char kLarge[] = "large";
 constexpr char kTooLarge[] = "tooLarge";
 
 int statusOf(const QNetworkReply* reply)
@@ -58,12 +62,22 @@ void dropConnections(QNetworkAccessManager* manager)
         Qt::QueuedConnection);
 }
 
+/// Gives back what a large body leaves free between smaller blocks, which the C library would keep.
+void trimAfter(QNetworkReply* reply)
+{
+    QObject::connect(reply, &QObject::destroyed, [] { QTimer::singleShot(0, [] { malloc_trim(0); }); });
+}
+
 } // namespace
 
 void watchReply(QNetworkReply* reply)
 {
     // Nobody reads before the end, so what is there is the whole body so far.
     QObject::connect(reply, &QNetworkReply::readyRead, reply, [reply] {
+        if (reply->bytesAvailable() > kLargeBytes && !reply->property(kLarge).toBool()) {
+            reply->setProperty(kLarge, true);
+            trimAfter(reply);
+        }
         if (reply->bytesAvailable() <= http::kMaxReplyBytes)
             return;
         reply->setProperty(kTooLarge, true);

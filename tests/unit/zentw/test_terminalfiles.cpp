@@ -114,13 +114,13 @@ private slots:
     void killedWriterLeavesAWholeFile()
     {
         constexpr int kKills = 200;
-        constexpr int kLongestUs = 20000;
         const QTemporaryDir directory;
         const QString path = directory.filePath("userinfo.json");
         const auto files = [&] { return QDir(directory.path()).entryList(QDir::Files | QDir::Hidden); };
         // Long enough for a kill to meet a write.
         const QByteArray versions[] = {QByteArray(300000, 'a'), QByteArray(200000, 'b')};
         testfiles::write(path, versions[0]);
+        int longestUs = 20000;
         QVERIFY(QFile::setPermissions(path, QFile::ReadOwner | QFile::WriteOwner));
         int interrupted = 0;
         for (int kill = 0; kill < kKills; ++kill) {
@@ -130,13 +130,16 @@ private slots:
                     zent::base::replaceFile(path, versions[round % 2]);
             }
             QVERIFY(writer > 0);
-            usleep(1000 + QRandomGenerator::global()->bounded(kLongestUs));
+            usleep(1000 + QRandomGenerator::global()->bounded(longestUs));
             QCOMPARE(::kill(writer, SIGKILL), 0);
             QCOMPARE(waitpid(writer, nullptr, 0), writer);
             const QByteArray found = testfiles::read(path);
             QVERIFY2(found == versions[0] || found == versions[1], qPrintable(QString::number(found.size())));
             QVERIFY2(files().size() <= 2, qPrintable(files().join(' ')));
             interrupted += files().size() - 1;
+            // Under a tool that slows the writer down it may not have come to write.
+            if (interrupted == 0 && kill % 25 == 24)
+                longestUs *= 2;
         }
         QVERIFY2(interrupted > 0, "no kill has met a write");
         QCOMPARE(zent::base::replaceFile(path, "end"), zent::base::WriteResult::Done);
