@@ -18,8 +18,6 @@ namespace
 
 constexpr int kHttpOk = 200;
 constexpr int kFirstErrorStatus = 400;
-constexpr qint64 kLargeBytes = 256 * 1024;
-constexpr char kLarge[] = "large";
 constexpr char kTooLarge[] = "tooLarge";
 
 int statusOf(const QNetworkReply* reply)
@@ -62,22 +60,12 @@ void dropConnections(QNetworkAccessManager* manager)
         Qt::QueuedConnection);
 }
 
-/// Gives back what a large body leaves free between smaller blocks, which the C library would keep.
-void trimAfter(QNetworkReply* reply)
-{
-    QObject::connect(reply, &QObject::destroyed, [] { QTimer::singleShot(0, [] { malloc_trim(0); }); });
-}
-
 } // namespace
 
 void watchReply(QNetworkReply* reply)
 {
     // Nobody reads before the end, so what is there is the whole body so far.
     QObject::connect(reply, &QNetworkReply::readyRead, reply, [reply] {
-        if (reply->bytesAvailable() > kLargeBytes && !reply->property(kLarge).toBool()) {
-            reply->setProperty(kLarge, true);
-            trimAfter(reply);
-        }
         if (reply->bytesAvailable() <= http::kMaxReplyBytes)
             return;
         reply->setProperty(kTooLarge, true);
@@ -91,6 +79,9 @@ void watchReply(QNetworkReply* reply)
         if (connectionFailed(reply))
             dropConnections(reply->manager());
     });
+    // Once a reply is done with, and a poll comes every minute or two, what lies free between blocks in use, such as
+    // the pieces of a large body or a closed dialog, goes back to the system; the C library would keep it.
+    QObject::connect(reply, &QObject::destroyed, [] { QTimer::singleShot(0, [] { malloc_trim(0); }); });
 }
 
 bool succeeded(const QNetworkReply* reply)
