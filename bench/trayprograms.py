@@ -55,14 +55,21 @@ def memory_of(pid):
 
 
 def work_of(pid):
-    """Context switches so far, and processor time in milliseconds, over all threads."""
-    switches, nanoseconds = 0, 0
+    """Context switches so far, and processor time in milliseconds, of each thread."""
+    work = {}
     for task in glob.glob(f"/proc/{pid}/task/*"):
         with open(task + "/status", encoding="utf-8") as stream:
-            switches += sum(int(number) for number in re.findall(r"ctxt_switches:\s+(\d+)", stream.read()))
+            switches = sum(int(number) for number in re.findall(r"ctxt_switches:\s+(\d+)", stream.read()))
         with open(task + "/schedstat", encoding="ascii") as stream:
-            nanoseconds += int(stream.read().split()[0])
-    return switches, nanoseconds / 1e6
+            work[task] = (switches, int(stream.read().split()[0]) / 1e6)
+    return work
+
+
+def work_between(before, after):
+    """What the threads did that live at the end; what one did that has ended meanwhile is not known."""
+    pairs = [(work, before.get(task, (0, 0))) for task, work in after.items()]
+    return {"switches": sum(now[0] - then[0] for now, then in pairs),
+            "cpu_ms": sum(now[1] - then[1] for now, then in pairs)}
 
 
 def wait_answered():
@@ -83,8 +90,7 @@ def measure_idle(desktop, probe, seconds, programs):
     before = {name: work_of(process.pid) for name, process in processes.items()}
     time.sleep(seconds)
     for name, process in processes.items():
-        after = work_of(process.pid)
-        figures[name].update(switches=after[0] - before[name][0], cpu_ms=after[1] - before[name][1])
+        figures[name].update(work_between(before[name], work_of(process.pid)))
         end(process)
     return figures
 
