@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The lunar date of every supported day, by the client and by ICU's Chinese calendar. Prints one line of nanoseconds a
 // day: client, ICU.
 

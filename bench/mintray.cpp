@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The least a Qt 5 tray program can be: one icon, no window. Its figures are the limit for the client's.
 
 #include <QApplication>

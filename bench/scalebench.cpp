@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What one large reply costs: scalebench KIND COUNT prints microseconds of parsing and the growth of the peak resident
 // size in KiB. KIND: scenes (COUNT entries), message (a body of COUNT bytes), connections (COUNT of them).
 
@@ -18,6 +19,8 @@
 
 namespace
 {
+
+using Connections = std::vector<zent::ActiveConnection>;
 
 long peakKib()
 {
@@ -55,8 +58,8 @@ Case makeCase(const QString& kind, int count)
                        count) +
                 "]",
             [](const QByteArray& body) {
-                return static_cast<int>(
-                    zent::activeConnections(zent::parseConnectionArray(body).value_or(QJsonArray())).size());
+                const auto array = zent::parseConnectionArray(body).value_or(QJsonArray());
+                return static_cast<int>(zent::primaryConnections(array).value_or(Connections()).size());
             }};
 }
 

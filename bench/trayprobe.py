@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """A tray host that only takes the time: an XEmbed tray on the room's X server that says when an icon asks for a place."""
 
 import select

@@ -1,7 +1,10 @@
+# SPDX-License-Identifier: Apache-2.0
 """Measures tray programs in a room with the simulated platform, and prints the figures as JSON.
 
-    trayprograms.py start RUNS NAME=PROGRAM...      milliseconds from the start of a program to its icon's request
+    trayprograms.py start RUNS NAME=PROGRAM...      milliseconds from the start of a program to its icon's request, and
+                                                    of processor time until then
     trayprograms.py idle SECONDS NAME=PROGRAM...    memory after 20 s, then the switches and processor time of idle seconds
+    trayprograms.py beside SECONDS NAME=PROGRAM...  the same with a TLS program and another nm-tray beside
 """
 
 import glob
@@ -32,17 +35,19 @@ def quicken_id():
 
 
 def measure_start(desktop, probe, runs, programs):
-    """Lists of milliseconds by name; the programs take turns, so that what else the machine does meets all of them."""
+    """Lists by name of milliseconds that passed and that the processor worked; the programs take turns, so that what else
+    the machine does meets all of them."""
     times = {name: [] for name in programs}
     for run in range(runs + 1):
         for name, program in programs.items():
             begin = time.perf_counter()
             process = desktop.spawn([program])
             moment = probe.wait_icon(20)
+            work = sum(milliseconds for _, milliseconds in work_of(process.pid).values())
             end(process)
             # The first round fills the caches.
             if run > 0 and moment is not None:
-                times[name].append((moment - begin) * 1000)
+                times[name].append(((moment - begin) * 1000, work))
     return times
 
 
@@ -50,8 +55,10 @@ def memory_of(pid):
     """Proportional and private size in KiB."""
     with open(f"/proc/{pid}/smaps_rollup", encoding="ascii") as stream:
         sizes = {name: int(size) for name, size in re.findall(r"^(\w+):\s+(\d+) kB", stream.read(), re.M)}
+    with open(f"/proc/{pid}/maps", encoding="utf-8") as stream:
+        libraries = set(re.findall(r" r-xp .* (/\S+\.so[.\d]*)$", stream.read(), re.M))
     return {"pss": sizes["Pss"], "private": sizes["Private_Clean"] + sizes["Private_Dirty"],
-            "dirty": sizes["Private_Dirty"], "rss": sizes["Rss"]}
+            "dirty": sizes["Private_Dirty"], "rss": sizes["Rss"], "libraries": len(libraries)}
 
 
 def work_of(pid):
@@ -75,6 +82,14 @@ def work_between(before, after):
 def wait_answered():
     """Until the server has answered everything that the client asks for at its start."""
     roomclient.wait_record(lambda entry: entry.get("path") == "/api/client/area/scenes", 30)
+
+
+def measure_beside(desktop, probe, seconds, programs):
+    """On a desktop other programs have the same libraries loaded, so that their pages count as shared."""
+    desktop.spawn(["openssl", "s_client", "-quiet", "-connect", "server.zent.test:443"])
+    desktop.spawn([programs["nm-tray"]])
+    probe.wait_icon(20)
+    return measure_idle(desktop, probe, seconds, programs)
 
 
 def measure_idle(desktop, probe, seconds, programs):
@@ -102,7 +117,7 @@ def main():
     with Desktop() as desktop:
         desktop.start_window_manager()
         probe = TrayProbe(desktop.env["DISPLAY"])
-        measure = measure_start if kind == "start" else measure_idle
+        measure = {"start": measure_start, "idle": measure_idle, "beside": measure_beside}[kind]
         print(json.dumps(measure(desktop, probe, amount, programs)))
         probe.close()
 

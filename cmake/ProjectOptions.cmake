@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # Settings that every target of the project shares.
 
 set(CMAKE_CXX_STANDARD 17)

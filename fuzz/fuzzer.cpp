@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One fuzzer: the target ZENT_FUZZ_TARGET, driven by libFuzzer.
 
 #include "jsonmutator.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Runs every file of the corpus through its target: what fuzzing has found stays found, with any compiler.
 
 #include "targets.h"

@@ -1,7 +1,9 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "targets.h"
 
 #include "activeconnections.h"
 #include "baseutils.h"
+#include "displaytext.h"
 #include "filecontent.h"
 #include "gates.h"
 #include "notifymessages.h"
@@ -9,6 +11,8 @@
 #include "pcnamerules.h"
 #include "releasereply.h"
 #include "replies.h"
+#include "terminalinfo.h"
+#include "texttargets.h"
 
 #include <QJsonDocument>
 #include <QRegExp>
@@ -43,6 +47,12 @@ void requireBounded(const QStringList& texts, const QByteArray& input)
     for (const QString& text : texts)
         size += text.size();
     require(size <= input.size(), "the texts are no longer than the input");
+}
+
+/// What is sent back, written or compared is whole or not there.
+void requireIdentifier(const QString& text)
+{
+    require(text.size() <= 1000, "a longer text is no identifier");
 }
 
 template <typename T>
@@ -87,8 +97,10 @@ QString parseScenes(const QByteArray& input)
     const int elements = objectOf(input).value(QLatin1String("message")).toArray().size();
     require(static_cast<int>(reply.value.size()) == (reply.isGood() ? elements : 0), "every element is a scene");
     QStringList texts;
-    for (const zent::Scene& scene : reply.value)
+    for (const zent::Scene& scene : reply.value) {
+        requireIdentifier(scene.code);
         texts << scene.name << scene.code;
+    }
     requireBounded(texts, input);
     return texts.join('|');
 }
@@ -98,9 +110,11 @@ QString parseMessages(const QByteArray& input)
     const QList<NotifyMessage> messages = zent::parseMessageList(input);
     require(messages.size() <= QJsonDocument::fromJson(input).array().size(), "an element is one message at most");
     QStringList texts;
-    for (const NotifyMessage& message : messages)
+    for (const NotifyMessage& message : messages) {
+        requireIdentifier(message.uuid);
         texts << message.uuid << message.uid << message.send_uid << message.title << message.content
               << message.created_at << message.read_at;
+    }
     requireBounded(texts, input);
     return texts.join('|');
 }
@@ -128,6 +142,7 @@ QString parseNotifySettings(const QByteArray& input)
     const QString url = config->url(QStringLiteral("list"));
     require(url.endsWith("/list"), "the URL ends in the request kind");
     requireBounded({config->host, config->token}, input);
+    requireIdentifier(config->token);
     return url + '|' + config->token;
 }
 
@@ -136,10 +151,16 @@ QString parseConnections(const QByteArray& input)
     const auto array = zent::parseConnectionArray(input);
     if (!array)
         return QString();
-    const auto connections = zent::activeConnections(*array);
-    require(static_cast<int>(connections.size()) == array->size(), "every element is a connection");
-    QStringList texts;
-    for (const zent::ActiveConnection& connection : connections)
+    const auto connections = zent::primaryConnections(*array);
+    const auto hwAddress = zent::primaryHwAddress(*array);
+    require(!connections || connections->empty() == !hwAddress, "an address comes from a primary connection");
+    QStringList texts(hwAddress.value_or(QString()));
+    if (!connections)
+        return texts.first();
+    require(static_cast<int>(connections->size()) <= array->size(), "an element is one connection at most");
+    require(connections->empty() || connections->front().hwAddress == *hwAddress, "the first one's address");
+    texts.clear();
+    for (const zent::ActiveConnection& connection : *connections)
         texts << connection.hwAddress << connection.speed << connection.address << connection.mask << connection.gateway
               << connection.dns;
     requireBounded(texts, input);
@@ -158,6 +179,23 @@ QString parseNamingRule(const QByteArray& input)
     const auto verdict = zent::parsePcNameVerdict(input);
     require(!verdict || verdict->accepted == saysSuccess(input), "a name is accepted with the code 0 only");
     return rule.expression + '|' + (verdict ? verdict->message : QString());
+}
+
+/// A text as it is shown, at the limits that there are and at one that short inputs reach.
+QString displayText(const QByteArray& input)
+{
+    using namespace zent::display;
+    const QString text = QString::fromUtf8(input);
+    QString shown;
+    for (const int length : {1, 7, kSceneNameLength, kValueLength, kContentLength}) {
+        shown = cut(text, length);
+        require(shown.size() <= length + 1, "no more is shown than the limit and the sign of a cut");
+        require((shown == text) == (text.size() <= length) || text.size() == length + 1, "only what is long is cut");
+        require(text.size() <= length || text.startsWith(shown.chopped(1)), "the beginning is shown");
+        require(text.size() <= length || shown.size() < 2 || !shown.at(shown.size() - 2).isHighSurrogate(),
+                "no character is cut in two");
+    }
+    return shown;
 }
 
 /// Processor time: the machine may be busy with something else.
@@ -266,6 +304,12 @@ const std::vector<Target>& targets()
         {"passwordpolicy", parsePasswordPolicy},
         {"passwordanswers", parsePasswordAnswers},
         {"release", parseRelease},
+        {"display", displayText},
+        {"fileconfig", readFileConfig},
+        {"migration", migrateUserInfo},
+        {"logtexts", logTexts},
+        {"urls", buildUrls},
+        {"counts", countMessages},
     };
     return all;
 }

@@ -1,11 +1,12 @@
+# SPDX-License-Identifier: Apache-2.0
 """Measures how well the texts on the gallery's pictures stand out from what is behind them.
 
     contrast.py [-v] PICTURE...
 
-A picture is cut along empty rows and columns until single blocks are left; a block filled with a colour of its own (a
-button, a field) is cut further inside. Of each block of text the contrast is measured as WCAG 2 defines it, between the
-colour behind it and that of the cores of its strokes. Texts need 4.5:1, the panel's links and the drawn signs 3:1; what
-is disabled is exempt. The exit status is 1 when something misses its bar, or a window shows fewer texts than it should.
+A picture is cut along empty rows and columns until single blocks are left. A block filled with a colour of its own (a
+button, a field) is cut further inside. The contrast of each block of text is measured as WCAG 2 defines it, between the
+colour behind it and the cores of its strokes. Texts need 4.5:1, the panel's links and the drawn signs 3:1; what is
+disabled is exempt. The exit status is 1 when something misses its bar, or a window shows fewer texts than it should.
 
 Measure pictures at scale 2: at scale 1 thin strokes cover no whole pixel and look paler than they are.
 """
@@ -19,7 +20,7 @@ import numpy
 from PIL import Image
 
 TEXT, LINK, SIGN, EXEMPT = 4.5, 3.0, 3.0, 0.0
-# The share of a block's inked pixels that are paler than what counts as a core; a cursor is less than the rest of them.
+# The share of a block's inked pixels that are paler than its core. A cursor has fewer pixels than the rest.
 CORE = 0.9
 # Lengths at scale 1: a plate's edge, what is too small for text, the smallest plate, the gaps between blocks.
 EDGE, TINY, PLATE, TALL = 4, 5, 20, 60
@@ -33,12 +34,11 @@ _PANEL = _TITLE_BAR + [("link", (150, -46, 300, -18), LINK), ("tick box", (8, -4
                        ("arrow", (260, -125, 290, -95), SIGN)]
 _PASSWORD = _TITLE_BAR + [("sign in the field", (-76, 96, -15, 222), SIGN)]
 _CONFIRM = [("disabled button", (14, 222, 196, 262), EXEMPT)]
-_BOX = [("picture", (0, 0, 48, 60), SIGN)]
 
 # By window: how many texts it shows at least, and what on it is not plain text: (name, area, bar). Negative coordinates
 # count from the right and the bottom.
 WINDOWS = {
-    "start-up": (2, _BOX),
+    "start-up": (3, _TITLE_BAR),
     "panel-plain": (17, _PANEL),
     "panel-login": (20, _PANEL),
     "panel-network": (24, _PANEL),
@@ -47,7 +47,7 @@ WINDOWS = {
     "notice-several": (7, _TITLE_BAR),
     "notice-one": (6, _TITLE_BAR),
     "notice-none": (6, _TITLE_BAR),
-    "notice-failed": (2, _BOX),
+    "notice-failed": (3, _TITLE_BAR),
     "integrity": (3, _TITLE_BAR),
     "password-empty": (5, _PASSWORD + _CONFIRM),
     "password-caps-lock": (5, _PASSWORD + _CONFIRM),
@@ -60,7 +60,7 @@ WINDOWS = {
     "release-filled": (4, _TITLE_BAR),
     "release-refused": (1, _TITLE_BAR),
     "release-offline": (1, _TITLE_BAR),
-    "release-running": (1, _TITLE_BAR + [("spinner", (100, 54, 148, 80), EXEMPT),
+    "release-running": (1, _TITLE_BAR + [("spinner", (66, 54, 98, 80), EXEMPT),
                                          ("disabled button", (100, 95, 280, 145), EXEMPT)]),
     "release-reboot": (3, _TITLE_BAR),
 }
@@ -86,7 +86,7 @@ def _dominant(pixels):
 
 
 def _runs(marked, gap):
-    """Where marked is true, as (start, end), with gaps shorter than this taken in."""
+    """Where marked is true, as (start, end). Gaps shorter than this are bridged."""
     found = []
     for at in numpy.flatnonzero(marked):
         if found and at - found[-1][1] < gap:

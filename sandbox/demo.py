@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """Shows the client on a small desktop inside a room and takes pictures of it.
 
     demo.py CLIENT PICTURES [--window]
@@ -12,8 +13,7 @@ import sys
 
 import roomclient
 from desktop import Desktop, stop
-from stage import (LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE,
-                   RELEASE_LINK, RELEASE_SIZE, SPINNER_SIZE, Stage)
+from stage import NOTICE, PASSWORD, RELEASE, Stage
 
 BACKGROUND = "#3d5a80"
 
@@ -27,10 +27,10 @@ class Demo(Stage):
         self.desktop.click_icon(button=3)
         self.desktop.click_icon()
         panel = self.desktop.wait("the panel", self.desktop.panel)
-        self.desktop.wait("the scene box", lambda: self.desktop.geometry(panel)[3] > 520)
-        for name, button in (("login", LOGIN_BUTTON), ("network", NETWORK_BUTTON)):
+        self.reader.control(role="combo box")
+        for name, button in (("login", "登录信息"), ("network", "网络信息")):
             asked = len(roomclient.record("dbus", method="GetActiveConnectionInfo"))
-            self.desktop.click_in(panel, *button)
+            self.click(button)
             self.desktop.wait("the page", lambda: len(roomclient.record("dbus", method="GetActiveConnectionInfo")) > asked)
             self.desktop.run("xdotool", "mousemove", "400", "300")
             self.picture(f"panel-{name}", panel)
@@ -50,12 +50,12 @@ class Demo(Stage):
         self.desktop.wait("the notification", lambda: "1" in self.desktop.run("dunstctl", "count", "displayed"))
         self.picture("message-pushed")
         self.desktop.run("dunstctl", "action")
-        notice = self.dialog(NOTICE_SIZE)
+        notice = self.window(NOTICE)
         self.desktop.run("dunstctl", "close-all")
         self.picture("message-several", notice)
-        for name, button in (("message-last", (-100, -30)), ("message-none", (214, -30))):
+        for name, button in (("message-last", "下一条"), ("message-none", "已读")):
             listed = len(roomclient.record("http", path="/notification/v2/list"))
-            self.desktop.click_in(notice, *button)
+            self.click(button)
             self.desktop.wait("the refresh", lambda: len(roomclient.record("http", path="/notification/v2/list")) > listed)
             self.picture(name, notice)
         self.keys(notice, "Escape")
@@ -63,8 +63,8 @@ class Demo(Stage):
 
     def password(self):
         """A refused password change, then one that succeeds."""
-        self.desktop.click_in(self.desktop.panel(), *PASSWORD_LINK)
-        dialog = self.dialog(PASSWORD_SIZE)
+        self.click(PASSWORD)
+        dialog = self.window(PASSWORD)
         for old, name in (("wrong", "password-alert"), ("Zent@2026", None)):
             self.keys(dialog, "ctrl+a")
             for text in (old, "New@2026x", "New@2026x"):
@@ -89,20 +89,16 @@ class Demo(Stage):
 
     def release(self):
         """A refused administrator password, then the release up to the reboot prompt."""
-        self.desktop.click_in(self.desktop.panel(), *RELEASE_LINK)
-        dialog = self.dialog(RELEASE_SIZE)
+        self.click(RELEASE)
+        dialog = self.window(RELEASE)
         self.type(dialog, "wrong")
         self.picture("release-password", dialog)
-        before = {window for window, _ in self.desktop.windows()}
-        self.keys(dialog, "Return")
-        box = self.desktop.wait("the message", lambda: next(
-            (window for window, _ in self.desktop.windows() if window not in before), None))
+        box = self.opened_by(lambda: self.keys(dialog, "Return"))
         self.picture("release-refused")
         self.keys(box, "Escape")
         self.gone(box)
         self.type(dialog, "Admin@2026")
-        self.keys(dialog, "Return")
-        spinner = self.dialog(SPINNER_SIZE)
+        spinner = self.opened_by(lambda: self.keys(dialog, "Return"))
         self.desktop.screenshot(os.path.join(self.directory, "release-running.png"), spinner)
         roomclient.wait_record(lambda entry: entry.get("path") == "/uim/v3/client/remove")
         # The worker's last step; the prompt follows at once.
@@ -122,9 +118,9 @@ def main():
         desktop.start_window_manager()
         desktop.start_tray()
         desktop.start_notifications()
+        demo = Demo(desktop, options.pictures)
         client = desktop.start_client(options.client)
         desktop.wait("the tray icon", desktop.icon)
-        demo = Demo(desktop, options.pictures)
         for scene in (demo.panel, demo.messages, demo.integrity, demo.password, demo.release):
             scene()
         if options.window:

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """Takes a picture of every window of the client, in one colour scheme and at one scale, inside a room.
 
     gallery.py CLIENT PICTURES [--theme light|dark] [--scale FACTOR]
@@ -6,25 +7,18 @@ The pictures are PICTURES/WINDOW-THEME-SCALE.png.
 """
 
 import argparse
+import filecmp
 import os
 import subprocess
 import sys
 
 import roomclient
 from desktop import Desktop, stop
-from stage import (LOGIN_BUTTON, NETWORK_BUTTON, NOTICE_SIZE, PASSWORD_LINK, PASSWORD_SIZE,
-                   RELEASE_LINK, RELEASE_SIZE, SPINNER_SIZE, Stage)
+from stage import NOTICE, PASSWORD, RELEASE, Stage
 
 BACKGROUNDS = {"light": "#8fa3b8", "dark": "#16202c"}
-SCENE_BOX = (180, -110)
-NEXT_BUTTON = (-100, -30)
-WIDE_BUTTON = (214, -30)
-REVEAL_BUTTON = (-33, 116)
 BUBBLE = "#B3261E"
-ACCENT = "#0067D6"
 WARNING = "#C62828"
-# A point of the reboot prompt's right button, beside its text; the form before has nothing there.
-PROMPT_BUTTON = (225, 128)
 USERINFO = "/etc/zent/userinfo.json"
 PLAIN_USER = "uid=1000(zhangsan) gid=1000(zhangsan) groups=1000(zhangsan),1002(zent-users)"
 
@@ -63,7 +57,7 @@ class Gallery(Stage):
                 return until(self.colours_of(path))
             with open(path, "rb") as stream:
                 seen.append(stream.read())
-            # A blinking cursor makes two pictures, in turns.
+            # A blinking cursor makes two pictures that alternate.
             return seen[-1] in seen[-4:-1]
 
         self.desktop.wait(f"the picture {name}", shot)
@@ -72,11 +66,6 @@ class Gallery(Stage):
     def colours_of(self, path):
         """The colours of a picture, as text."""
         return self.desktop.run("convert", path, "-unique-colors", "-depth", "8", "txt:-")
-
-    def colour_at(self, path, x, y):
-        """The colour of a point of a picture, given at scale 1, as text."""
-        x, y = round(x * self.desktop.scale), round(y * self.desktop.scale)
-        return self.desktop.run("convert", path, "-crop", f"1x1+{x}+{y}", "-depth", "8", "txt:-")
 
     def colours(self, window):
         """The colours of a window on the screen, as text."""
@@ -89,13 +78,6 @@ class Gallery(Stage):
         self.desktop.click_icon(button=3)
         self.desktop.click_icon()
         return process, self.desktop.wait("the panel", self.desktop.panel)
-
-    def opened_by(self, action):
-        """The client's window that an action opens."""
-        before = {window for window, _ in self.desktop.windows()}
-        action()
-        return self.desktop.wait("the new window", lambda: next(
-            (window for window, _ in self.desktop.windows() if window not in before), None))
 
     def rest_pointer(self):
         """Takes the pointer to where nothing lights up below it."""
@@ -111,6 +93,7 @@ class Gallery(Stage):
         """The box of a terminal whose info file goes away during the start."""
         roomclient.set_standin("id", hook=f"mv {USERINFO} {USERINFO}.away")
         box = self.opened_by(lambda: self.desktop.start_client(self.client))
+        self.rest_pointer()
         self.shoot("start-up", box)
         self.keys(box, "Return")
         self.gone(box)
@@ -133,12 +116,12 @@ class Gallery(Stage):
     def panel(self):
         """The panel's two pages, and the list of scenes."""
         _, panel = self.start()
-        self.desktop.wait("the scene box", lambda: self.desktop.geometry(panel)[3] > 520 * self.desktop.scale)
-        for name, button in (("network", NETWORK_BUTTON), ("login", LOGIN_BUTTON)):
-            self.asking("GetActiveConnectionInfo", lambda at=button: self.desktop.click_in(panel, *at))
+        self.reader.control(role="combo box")
+        for name, button in (("network", "网络信息"), ("login", "登录信息")):
+            self.asking("GetActiveConnectionInfo", lambda button=button: self.click(button))
             self.rest_pointer()
             self.shoot("panel-" + name, panel)
-        scenes = self.opened_by(lambda: self.desktop.click_in(panel, *SCENE_BOX))
+        scenes = self.opened_by(lambda: self.click(role="combo box"))
         self.shoot("panel-scenes", scenes)
         self.keys(scenes, "Escape")
         self.gone(scenes)
@@ -152,11 +135,12 @@ class Gallery(Stage):
         popup, _ = self.desktop.wait("the notification", lambda: self.desktop.windows("Dunst"))[0]
         self.shoot("notification", popup)
         self.desktop.run("dunstctl", "action")
-        notice = self.dialog(NOTICE_SIZE)
+        notice = self.window(NOTICE)
         self.desktop.run("dunstctl", "close-all")
         self.shoot("notice-several", notice)
         roomclient.add_fault({"path": "/notification/v2/read*"}, {"status": 500, "body": "{}"}, 1)
-        box = self.opened_by(lambda: self.desktop.click_in(notice, *NEXT_BUTTON))
+        box = self.opened_by(lambda: self.click("下一条"))
+        self.rest_pointer()
         self.shoot("notice-failed", box)
         self.keys(box, "Return")
         self.gone(box)
@@ -195,8 +179,8 @@ class Gallery(Stage):
 
     def password(self):
         """The password dialog and what it says."""
-        self.desktop.click_in(self.desktop.panel(), *PASSWORD_LINK)
-        dialog = self.dialog(PASSWORD_SIZE)
+        self.click(PASSWORD)
+        dialog = self.window(PASSWORD)
         self.rest_pointer()
         self.shoot("password-empty", dialog)
         self.keys(dialog, "Caps_Lock")
@@ -207,7 +191,7 @@ class Gallery(Stage):
         self.shoot("password-mismatch", dialog, until=alerting)
         self.keys(dialog, "shift+Tab", "ctrl+a")
         self.type(dialog, "New@2026x")
-        self.desktop.click_in(dialog, *REVEAL_BUTTON)
+        self.click("显示密码", within="请输入旧密码")
         self.rest_pointer()
         self.shoot("password-filled", dialog)
         for code, name in ((-100002, "old-alert"), (-500, "new-alert"), (-1, "failed")):
@@ -227,8 +211,8 @@ class Gallery(Stage):
 
     def release(self):
         """The release dialog up to the reboot prompt."""
-        self.desktop.click_in(self.desktop.panel(), *RELEASE_LINK)
-        dialog = self.dialog(RELEASE_SIZE)
+        self.click(RELEASE)
+        dialog = self.window(RELEASE)
         self.rest_pointer()
         self.shoot("release-empty", dialog)
         for name, password in (("release-refused", "wrong"), ("release-offline", "Admin@2026")):
@@ -241,22 +225,20 @@ class Gallery(Stage):
             self.shoot(name, box)
             self.keys(box, "Escape")
             self.gone(box)
-        # The worker takes a second. Once the window has drawn itself, the client waits here for the identity service.
+        # The worker takes a second. The delays let the window draw itself and then keep it on the screen.
         roomclient.add_fault({"dbus": "onDomainConfig"}, {"delay_ms": 500}, 1)
         roomclient.add_fault({"dbus": "Set", "service": "com.vantor.zent.iam"}, {"delay_ms": 4000}, 1)
         self.type(dialog, "Admin@2026")
-        self.keys(dialog, "Return")
-        spinner = self.dialog(SPINNER_SIZE)
-        # Until it has drawn itself, the dialog's button is seen in its place.
+        spinner = self.opened_by(lambda: self.keys(dialog, "Return"))
+        # Until the window has drawn itself, the picture shows the red button of the dialog behind it.
         self.shoot("release-running", spinner, until=lambda colours: WARNING not in colours)
-        if ACCENT in self.colour_at(self.taken[-1], *PROMPT_BUTTON):
-            print("release-running: the worker was faster than the camera", file=sys.stderr)
-            os.remove(self.taken.pop())
-        path = os.path.join(self.directory, "release-reboot" + self.suffix + ".png")
-        self.shoot("release-reboot", spinner, until=lambda _: ACCENT in self.colour_at(path, *PROMPT_BUTTON))
-        # Once more, without what was still being drawn.
-        self.taken.pop()
+        self.reader.control("立即重启")
         self.shoot("release-reboot", spinner)
+        running, prompt = self.taken[-2:]
+        if filecmp.cmp(running, prompt, shallow=False):
+            print("release-running: the worker was faster than the camera", file=sys.stderr)
+            os.remove(running)
+            self.taken.remove(running)
 
     def all(self):
         """Every scene; returns the pictures' files."""

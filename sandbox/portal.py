@@ -1,4 +1,5 @@
-"""A stand-in for the desktop portal on the room's session bus, as far as the client asks it: the colour scheme.
+# SPDX-License-Identifier: Apache-2.0
+"""A stand-in for the desktop portal on the room's session bus. It serves the colour scheme, which the client asks for.
 
     portal.py [SCHEME]
 

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """What tests and the demo use within a room to steer the platform and to look at what happened."""
 
 import json

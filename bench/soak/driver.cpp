@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Linked beside the client's own main(): calls the slots that its poll timers call, a hundred times as often. Nothing
 // of the client knows about it. Notes each second what the heap holds.
 

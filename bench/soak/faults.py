@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """The faults of the soak: each is in force for some seconds.
 
 It explains certain warnings for as long, and a little more.
@@ -5,6 +6,7 @@ It explains certain warnings for as long, and a little more.
 
 import contextlib
 import dataclasses
+import json
 import random
 import re
 import signal
@@ -13,14 +15,16 @@ import time
 
 import roomclient
 
-# How long after its end a fault may still show: the longest time limit of a transfer, and some for a busy machine.
-AFTERMATH_S = 35
-# Long enough for each of the client's polls to meet it.
-WARM_UP_S = 2
+# How long after its end a fault may still show: the longest time that polls are held back, and some for a busy machine.
+AFTERMATH_S = 65
+# Long enough for polls to pile up, each on a connection of its own.
+WARM_UP_S = 2.5
 HTTP = r"(GET|PUT) .*(failed|not sent):|POST .*failed:|the message list holds no message"
+SLOW = r"GET .*not sent: .*is slow to answer"
 DAEMON = r"GetActiveConnectionInfo (failed:|gave no list)"
 IDENTITY = r"pam模块返回数据错误"
 NOTIFIER = r"DesktopNotifier .*(GetCapabilities|Notify) "
+LONG = "长" * 350_000
 GARBAGE = '{"code": 0, "data": [{]}\x00ÿ'
 
 
@@ -42,7 +46,11 @@ def http_faults():
         "error 500": ({"status": 500, "body": "<html>oops</html>"}, HTTP),
         "garbage": ({"status": 200, "body": GARBAGE}, HTTP),
         "large": ({"status": 200, "body_bytes": 2_000_000}, HTTP),
-        "slow": ({"delay_ms": 700}, "(?!)"),
+        "slow": ({"delay_ms": 700}, SLOW),
+        "slow and failing": ({"delay_ms": 1000, "status": 503, "body": "{}"}, HTTP),
+        "byte by byte": ({"drip_ms": 100}, HTTP),
+        "without an end": ({"endless": True}, HTTP),
+        "compressed bomb": ({"gzip_mib": 500}, HTTP),
         "dropped before the answer": ({"drop": "before"}, HTTP),
         "dropped in the answer": ({"drop": "mid"}, HTTP),
         "silent": ({"hang": True}, HTTP),
@@ -61,8 +69,14 @@ def bus_faults():
             yield Fault(f"{method}: {what}", explains, {"dbus": method}, action)
 
 
+# A user's and an organisation's reply in one: good, but each name is 1 MB without a blank.
+LONG_NAMES = {"code": 0, "data": {"name": LONG, "user": {
+    "gecos": f"{LONG},,,{LONG}", "client_name": LONG, "supplementtary_groups": [{"name": LONG}]}}}
+
 FAULTS = [
     *http_faults(), *bus_faults(),
+    Fault("long names", HTTP, {"path": "/uim/*", "method": "GET"},
+          {"body": json.dumps(LONG_NAMES, ensure_ascii=False)}),
     Fault("servers not listening", HTTP, state={"listening": False}),
     Fault("certificate expired", HTTP, state={"tls": {"certificate": "expired"}}),
     Fault("certificate of another authority", HTTP, state={"tls": {"certificate": "other_ca"}}),
@@ -99,7 +113,7 @@ class Faults(threading.Thread):
     def warm_up(self):
         """Each thing that can befall a request once, so that what its first time needs is there."""
         for fault in FAULTS:
-            if fault.name.startswith("all: "):
+            if fault.name.startswith(("all: ", "long names")):
                 self._hold(fault, WARM_UP_S)
 
     @contextlib.contextmanager

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """Runs the client through events and faults inside a room and says whether it grew or complained.
 
     soak.py CLIENT DIRECTORY [MINUTES] [--seed NUMBER]
@@ -133,15 +134,15 @@ class Soak:
             desktop.notifications(True)
             desktop.start_portal("light")
             os.makedirs("/run/user/1000/gvfs/mtp:host=Foo_SER1")
-            self.client = desktop.start_client(self.options.client)
-            desktop.wait("the tray icon", desktop.icon)
-            self.sampler = Sampler(self.client.pid)
             self.faults = Faults(seed, desktop.parts)
             self.events = Events(desktop, self.faults, random.Random(seed + 1))
+            self.client = desktop.start_client(self.options.client)
+            desktop.wait("the tray icon", desktop.icon, 15)
+            self.sampler = Sampler(self.client.pid)
             desktop.click_icon(button=3)
             # Faults begin when the client has what it shows; a scene box that never comes could not be used.
-            panel = self.events.shown_panel()
-            roomclient.wait_for(lambda: desktop.geometry(panel)[3] > 520, 30, "the scenes")
+            self.events.shown_panel()
+            self.events.reader.control(role="combo box", timeout=30)
             self.sampler.start()
             # Everything once, so that what is made on first use is there when the second minute begins.
             for event in self.events.all:
@@ -211,7 +212,8 @@ class Soak:
             print(f"| {name} | {measured} | {limit} | {'kept' if kept else '**failed**'} |")
         median = statistics.median
         columns = [("Pss KiB, median", "pss", median), ("own pages KiB, median", "own", median),
-                   ("file pages KiB, median", "library", median), ("heap in use KiB, least", "heap", min), ("open files, fewest", "files", min),
+                   ("file pages KiB, median", "library", median), ("heap in use KiB, least", "heap", min),
+                   ("open files, fewest", "files", min),
                    ("open sockets, fewest", "sockets", min), ("threads, median", "threads", median)]
         print("\n| minute | " + " | ".join(title for title, *_ in columns) + " |\n" + "|---" * (len(columns) + 1) + "|")
         for minute in range(1, self.options.minutes + 1):

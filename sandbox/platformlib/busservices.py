@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """The D-Bus services: network daemon, identity service, domain agent and login manager.
 
 They work on whole messages instead of exported objects, because a service must also be able to stay silent, to answer

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """The control interface, by which tests and the demo steer the platform."""
 
 import json

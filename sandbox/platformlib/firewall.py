@@ -1,4 +1,5 @@
-"""Loses what is sent to the platform, as a network does that swallows packets."""
+# SPDX-License-Identifier: Apache-2.0
+"""Drops what is sent to the platform, like a network that loses packets."""
 
 import socket
 
@@ -12,7 +13,7 @@ class Firewall:
         self._ports = ", ".join(str(port) for port in ports)
 
     def black_hole(self, on):
-        """Has every packet to the ports vanish, or none; in force on return."""
+        """Drops every packet to the ports, or none. The rule is in force on return."""
         if self._stream is None:
             raise RuntimeError("the platform was started without a way to the packet filter")
         rules = "delete table inet room"

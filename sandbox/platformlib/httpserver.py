@@ -1,6 +1,8 @@
+# SPDX-License-Identifier: Apache-2.0
 """A small HTTP/1.1 server that speaks TLS and plain HTTP on the same port."""
 
 import base64
+import functools
 import itertools
 import json
 import socket
@@ -8,6 +10,7 @@ import ssl
 import threading
 import time
 import urllib.parse
+import zlib
 from dataclasses import dataclass, field
 from http import HTTPStatus
 
@@ -160,6 +163,9 @@ def answer_with_fault(connection, action, respond):
         connection.wait_for_end()
     if action.get("drop") == "before":
         raise Closed
+    if "gzip_mib" in action:
+        action = {**action, "body_base64": base64.b64encode(compressed(action["gzip_mib"])),
+                  "headers": {"Content-Encoding": "gzip"}}
     if "body_base64" in action:
         body = base64.b64decode(action["body_base64"])
     elif "body_bytes" in action:
@@ -169,7 +175,11 @@ def answer_with_fault(connection, action, respond):
     replaced = any(key in action for key in ("status", "body", "body_base64", "body_bytes"))
     response = Response(action.get("status", 200), body) if replaced else respond()
     response.headers.update(action.get("headers", {}))
+    if action.get("endless"):
+        send_endless(connection)
     data = response.encode()
+    if "drip_ms" in action:
+        drip(connection, data, action["drip_ms"] / 1000)
     if action.get("drop") == "mid":
         # Half of the body, or of the head where there is no body: never a complete answer.
         connection.socket.sendall(data[:len(data) - (len(response.body) + 1) // 2 if response.body else len(data) // 2])
@@ -177,8 +187,30 @@ def answer_with_fault(connection, action, respond):
     connection.socket.sendall(data)
 
 
+@functools.lru_cache
+def compressed(mebibytes):
+    """That many MiB of blanks, about a thousandth of it when compressed."""
+    packer = zlib.compressobj(wbits=zlib.MAX_WBITS | 16)
+    return b"".join([packer.compress(b" " * 2**20) for _ in range(mebibytes)] + [packer.flush()])
+
+
+def send_endless(connection):
+    """Sends a body until the client has had enough of it."""
+    connection.socket.sendall(b"HTTP/1.1 200 OK\r\nConnection: close\r\n\r\n")
+    while True:
+        connection.socket.sendall(b"x" * 65536)
+
+
+def drip(connection, data, seconds):
+    """Sends the data one byte at a time, until the client has had enough of it."""
+    for index in range(len(data)):
+        connection.socket.sendall(data[index:index + 1])
+        time.sleep(seconds)
+    raise Closed
+
+
 class Server:
-    """Listens on some ports and runs a thread a connection."""
+    """Listens on some ports and runs a thread for each connection."""
 
     def __init__(self, ports, handler, host="0.0.0.0", on_tls_error=None):
         """handler(connection, request) answers; on_tls_error(connection, text) hears of failed handshakes."""
@@ -190,9 +222,14 @@ class Server:
         self._listeners = []
         self._connections = set()
 
-    def use_tls(self, certificate, key, authority, demand):
-        """Serves TLS with this material from now on; connections made with other material end."""
+    def use_tls(self, certificate, key, authority, demand, newest=None):
+        """Serves TLS with this material from now on; connections made with other material end. newest: the last version
+        of TLS that is served."""
         context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
+        if newest:
+            context.set_ciphers("ALL:@SECLEVEL=0")
+            context.minimum_version = ssl.TLSVersion.TLSv1
+            context.maximum_version = ssl.TLSVersion[newest]
         context.load_cert_chain(certificate, key)
         context.load_verify_locations(authority)
         context.verify_mode = ssl.CERT_REQUIRED if demand else ssl.CERT_OPTIONAL

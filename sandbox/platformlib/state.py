@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """What the simulated platform knows: served data, switches, faults and the record of the room."""
 
 import base64
@@ -61,7 +62,7 @@ def default_state():
         }],
         "iam": {"enable": True, "read_only": False, "min_length": 8},
         "zentg": {"result": 0},
-        "tls": {"certificate": "server", "demand_client_certificate": False},
+        "tls": {"certificate": "server", "demand_client_certificate": False, "newest": ""},
         "listening": True,
         "black_hole": False,
         "services": {"network": True, "iam": True, "zentg": True, "login1": True},
@@ -82,7 +83,7 @@ def merge_patch(target, patch):
 
 
 class Store:
-    """The state, guarded by one lock, with those that want to hear of changes."""
+    """The state, guarded by one lock, and the listeners to its changes."""
 
     def __init__(self):
         self.lock = threading.RLock()
@@ -90,7 +91,7 @@ class Store:
         self._listeners = []
 
     def on_change(self, listener):
-        """Has listener(old, new) called after every patch, before the patch is answered."""
+        """Calls listener(old, new) after every patch, before the patch is answered."""
         self._listeners.append(listener)
 
     def patch(self, changes):
@@ -120,7 +121,7 @@ class Record:
             return [json.loads(line) for line in stream if line.endswith("\n")]
 
     def clear(self):
-        """Empties the record; writers go on at its start because all of them append."""
+        """Empties the record. Writers append, so they go on at its start."""
         os.truncate(self._path, 0)
 
 

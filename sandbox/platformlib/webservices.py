@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """The platform's HTTP services: management API, scenes and notification service."""
 
 import copy

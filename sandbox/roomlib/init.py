@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """The room's first process: starts the services and the command, reaps, receives syslog, and ends it all."""
 
 import os
@@ -32,7 +33,7 @@ def environment(options):
         "GSETTINGS_SCHEMA_DIR": f"{ROOM}/schemas", "GSETTINGS_BACKEND": "keyfile",
     })
     if not options.chinese_locale:
-        # LC_CTYPE alone would leave programs with the C locale: setlocale(LC_ALL, "") fails when LANG is not to be had.
+        # With LC_CTYPE alone programs would have the C locale: setlocale(LC_ALL, "") fails when that of LANG is missing.
         result.update({"LC_CTYPE": "C.UTF-8", "LOCPATH": f"{ROOM}/locale"})
     if options.x11:
         result["DISPLAY"] = options.display
@@ -81,8 +82,8 @@ class Init:
         try:
             linux.mount("proc", "/proc", "proc", linux.MS_NOSUID | linux.MS_NODEV | linux.MS_NOEXEC)
         except OSError:
-            # Where parts of the outside /proc are masked the kernel refuses a new one. The outside one still
-            # shows each process itself; only its numbers are those of the outside.
+            # Where parts of the outside /proc are masked, the kernel refuses a new one. The outside one still
+            # shows each process, under its number outside.
             linux.set_read_only("/proc", False)
         linux.bring_loopback_up()
         socket.sethostname(terminal.HOST_NAME)
@@ -109,7 +110,7 @@ class Init:
         return receiver
 
     def _start_services(self):
-        """Runs what does not depend on each other at the same time; returns when all of it is ready."""
+        """Starts independent services at the same time; returns when all are ready."""
         quiet = {1: self.log, 2: self.log}
         buses = [self._start_bus("session", f"{self.env['XDG_RUNTIME_DIR']}/bus"),
                  self._start_bus("system", "/run/dbus/system_bus_socket")]
@@ -191,7 +192,7 @@ class Init:
         os.write(journal, datagram if datagram.endswith(b"\n") else datagram + b"\n")
 
     def _drain(self, journal, syslog):
-        """What the command logged just before its end still belongs into the file."""
+        """Writes what the command logged just before its end."""
         syslog.setblocking(False)
         try:
             while True:

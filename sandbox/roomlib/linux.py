@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """The Linux system calls that a room needs and that Python 3.11 does not offer."""
 
 import ctypes

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """What a room makes anew on opening: TLS material, compiled schemas and bus configurations."""
 
 import glob

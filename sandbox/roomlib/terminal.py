@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """The files of a managed terminal, written into the upper layers of the room's overlays."""
 
 import json

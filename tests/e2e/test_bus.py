@@ -1,14 +1,23 @@
+# SPDX-License-Identifier: Apache-2.0
 """What the client offers on the session bus, and what it does where others there stand in its way."""
 
 import os
 import subprocess
 import xml.etree.ElementTree as ElementTree
 
+from gi.repository import Gio, GLib
+
 from clienttest import TREE, ClientTest, read, roomclient, unittest
 
 SERVICE = "com.vantor.tarn"
 NOTIFICATION = "/com/vantor/tarn/Notification"
 FULLZONE = "/com/vantor/tarn/Fullzone"
+OBJECTS = {NOTIFICATION: "com.vantor.tarn.Notification", FULLZONE: "com.vantor.tarn.Fullzone"}
+# A value of every basic type of D-Bus, and of every kind of container.
+SAMPLES = {signature: GLib.Variant(signature, value) for signature, value in {
+    "y": 7, "b": True, "n": -7, "q": 7, "i": -7, "u": 7, "x": -7, "t": 7, "d": 0.5, "s": "success", "o": "/a", "g": "as",
+    "h": 0, "v": GLib.Variant("s", "open"), "as": ["true"], "ay": b"\xff\0", "(si)": ("a", 1), "a{sv}": {},
+    "a(ov)": [("/", GLib.Variant("v", GLib.Variant("h", 0)))], "av": [GLib.Variant("d", float("nan"))] * 100}.items()}
 
 
 def gdbus(*arguments):
@@ -18,6 +27,23 @@ def gdbus(*arguments):
 def notification(method, *arguments):
     return gdbus("call", "--session", "-d", SERVICE, "-o", NOTIFICATION, "-m",
                  "com.vantor.tarn.Notification." + method, *arguments)
+
+
+def described_methods(interface):
+    """The types of each method's arguments."""
+    described = ElementTree.fromstring(read(os.path.join(TREE, "data", interface + ".xml"))).find("interface")
+    return {method.get("name"): [argument.get("type") for argument in method.findall("arg")]
+            for method in described.findall("method")}
+
+
+def wrong_signatures(types):
+    """Each argument as every other type, all of them as one type, and too few or too many arguments."""
+    for index in range(len(types)):
+        yield from (types[:index] + [other] + types[index + 1:] for other in SAMPLES if other != types[index])
+    yield from ([other] * len(types) for other in SAMPLES if [other] * len(types) != types)
+    yield from (types[:count] for count in range(len(types)))
+    yield from (types + [more] for more in SAMPLES)
+    yield types * 30
 
 
 class Bus(ClientTest):
@@ -37,10 +63,31 @@ class Bus(ClientTest):
                                               for a in m.findall("arg")]) for m in own[0] if m.tag != "annotation")
 
     def test_objects_offer_what_their_files_describe_and_nothing_else(self):
-        for path, name in {NOTIFICATION: "com.vantor.tarn.Notification", FULLZONE: "com.vantor.tarn.Fullzone"}.items():
+        for path, name in OBJECTS.items():
             live = gdbus("introspect", "--session", "--xml", "-d", SERVICE, "-o", path).stdout
             described = self.members(read(os.path.join(TREE, "data", name + ".xml")), name)
             self.assertEqual(self.members(live, name), described)
+
+    def test_calls_with_other_types_and_counts_are_refused(self):
+        bus = Gio.bus_get_sync(Gio.BusType.SESSION)
+        before = self.desktop.windows()
+        calls = 0
+        for path, interface in OBJECTS.items():
+            for method, types in described_methods(interface).items():
+                for signature in wrong_signatures(types):
+                    calls += 1
+                    arguments = GLib.Variant.new_tuple(*map(SAMPLES.get, signature)) if signature else None
+                    message = Gio.DBusMessage.new_method_call(SERVICE, path, interface, method)
+                    message.set_unix_fd_list(Gio.UnixFDList.new_from_array([os.dup(0)]))
+                    message.set_body(arguments or GLib.Variant("()", ()))
+                    reply, _ = bus.send_message_with_reply_sync(message, 0, 5000, None)
+                    self.assertEqual((reply.get_error_name() or "").rpartition(".")[2], "UnknownMethod",
+                                     (method, signature))
+        self.assertGreater(calls, 300)
+        self.assertEqual(notification("AgencyNotify", "a", "b").stdout, "()\n")
+        self.assertEqual(self.desktop.windows(), before)
+        self.assertEqual(roomclient.record("process", name="gio"), [])
+        self.assertIsNone(self.client.poll())
 
     def test_pushed_message_is_announced_once(self):
         with subprocess.Popen(["gdbus", "monitor", "--session", "-d", SERVICE, "-o", NOTIFICATION],

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """Start-up: gates, the single instance, the requests and the log of a start, and the ways to end."""
 
 import signal
@@ -39,6 +40,8 @@ class Start(ClientTest):
             self.start()
             roomclient.wait_syslog("parse config.json file ok.", 15)
             self.assertEqual([line for line in roomclient.syslog_lines() if not line.startswith(("<30>", "<31>"))], [])
+            with open(f"/proc/{self.client.pid}/maps", encoding="utf-8") as stream:
+                self.assertNotIn("bearer", stream.read())
             # Everything is asked once when the server answers.
             self.assertEqual(sorted(entry["path"] for entry in roomclient.record("http")
                                     if "/notification/" not in entry["path"]),

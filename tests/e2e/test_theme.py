@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """Light and dark: windows that follow the desktop, those that do not, and texts that stand out in both."""
 
 import os
@@ -9,7 +10,7 @@ from clienttest import CLIENT, ClientTest, roomclient, unittest
 
 import contrast
 from gallery import Gallery
-from stage import PASSWORD_LINK, PASSWORD_SIZE, Stage
+from stage import PASSWORD, Stage
 
 LIGHT, DARK = (0xfa, 0xfa, 0xfb), (0x25, 0x27, 0x2a)
 # A point of each window where nothing but its surface is.
@@ -33,8 +34,8 @@ class Live(ClientTest):
 
     def test_open_dialog_follows_a_portal_that_comes_later_and_the_panel_stays_light(self):
         panel = self.start_shown()
-        self.desktop.click_in(panel, *PASSWORD_LINK)
-        dialog = self.stage.dialog(PASSWORD_SIZE)
+        self.stage.click(PASSWORD)
+        dialog = self.stage.window(PASSWORD)
         self.await_surface(dialog, LIGHT)
         self.desktop.start_portal("none")
         for scheme, colour in (("dark", DARK), ("light", LIGHT), ("dark", DARK), ("none", LIGHT)):

@@ -1,9 +1,11 @@
+# SPDX-License-Identifier: Apache-2.0
 """The tray icon and the panel on a real X server with a real tray host and window manager."""
 
 from clienttest import SYSLOG, ClientTest, roomclient, unittest, write
 
+from stage import Stage
+
 SCREEN = (1280, 800)
-ON_TOP_BOX = (20, -32)
 
 
 class Tray(ClientTest):
@@ -29,6 +31,7 @@ class Tray(ClientTest):
         self.wait_hidden()
 
     def test_panel_as_a_window(self):
+        stage = Stage(self.desktop)
         panel = self.start_shown()
         self.until("the panel with its scenes", lambda: self.desktop.geometry(panel)[3] == 565)
         x, y, width, height = self.desktop.geometry(panel)
@@ -39,8 +42,7 @@ class Tray(ClientTest):
                          "mousemove_relative", "--sync", "--", "-50", "-40", "mouseup", "1")
         self.until("the panel to move", lambda: self.desktop.geometry(panel)[:2] == (x - 200, y - 100))
         for state in (True, False):
-            x, y, _, height = self.desktop.geometry(self.desktop.panel())
-            self.desktop.click(x + ON_TOP_BOX[0], y + height + ON_TOP_BOX[1])
+            stage.click("置顶显示")
 
             def settled(wanted=state):
                 window = self.desktop.panel()
@@ -53,7 +55,7 @@ class Tray(ClientTest):
         self.wait_hidden()
         self.desktop.click_icon()
         self.desktop.wait("the panel", self.desktop.panel)
-        self.desktop.click_panel(width - 24, 24)
+        stage.click("关闭")
         self.wait_hidden()
 
 

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """When the tray icon appears on desktops of either tray protocol, and what clicks on it do where Qt does not see them.
 
     test_trayhosts.py ROOM CLIENT
@@ -12,18 +13,19 @@ import sys
 
 if __name__ == "__main__" and "ROOM" not in os.environ:
     enter, client = sys.argv[1:]
-    command = [enter, "--platform", "--env", "CLIENT=" + client, "/usr/bin/python3", "-B", __file__, "-v"]
+    command = [enter, "--platform", "--env", "CLIENT=" + client, "--env", "PYTHONPATH=" + os.path.dirname(enter),
+               "/usr/bin/python3", "-B", __file__, "-v"]
     rooms = [subprocess.Popen(command + cases) for cases in (["LateXembed"], ["LateNotifier"],
                                                              ["Xembed", "Notifier", "Registry"])]
     sys.exit(max([room.wait() for room in rooms]))
 
-from clienttest import CLIENT, ClientTest, roomclient, unittest  # noqa: E402
+from clienttest import CLIENT, TREE, ClientTest, roomclient, unittest  # noqa: E402
 
 ICON_SECONDS = 1
 # Of the client's main thread in a minute without a tray. The questions to the server make some 25; a timer that looked
 # for the tray every second would add 60.
 MOST_WAKE_UPS = 70
-REGISTRY = os.path.join(os.path.dirname(os.path.abspath(__file__)), "registry.py")
+REGISTRY = os.path.join(TREE, "sandbox/registry.py")
 
 
 def gdbus(service, path, method, *arguments):
@@ -106,6 +108,14 @@ class LateNotifier(Late, NotifierHost):
 
 
 class Notifier(Soon, NotifierHost):
+    def test_balloon_goes_to_the_missing_service_too(self):
+        self.start_host()
+        self.start()
+        self.wait_icon()
+        gdbus("com.vantor.tarn", "/com/vantor/tarn/Notification", "com.vantor.tarn.Notification.Notify",
+              "1", "", "a", "b", "c")
+        roomclient.wait_syslog("neither a notification service nor a tray shows the message")
+
     def test_clicks(self):
         self.start_host()
         self.start()

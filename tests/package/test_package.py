@@ -1,12 +1,8 @@
 #!/usr/bin/python3
-"""The built package from installation to purge: run outside, this file runs itself in a room that dpkg may write to.
-
-In the room the user is root of a namespace of his own (unshare -r) and installs with the machine's dpkg: dependencies
-and triggers are those of real packages.
-"""
+# SPDX-License-Identifier: Apache-2.0
+"""The built package from installation to purge: run outside, this file runs itself in a room that dpkg may write to."""
 
 import configparser
-import contextlib
 import glob
 import os
 import shlex
@@ -14,49 +10,18 @@ import shutil
 import subprocess
 import sys
 
-TREE = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
-NAME = "zentw-info"
+sys.path.insert(0, os.path.join(os.path.dirname(os.path.abspath(__file__)), "../../sandbox"))
+
+from packageroom import (  # noqa: E402
+    DATABASE, INSIDE, NAME, built_package, dpkg, room_command, take_database, this_test)
+
+if not INSIDE:
+    command = room_command(built_package(), this_test())
+    os.execv(command[0], command)
+
+from clienttest import ClientTest, read, roomclient, stop, unittest, write  # noqa: E402
+
 AUTOSTART = f"/etc/xdg/autostart/{NAME}.desktop"
-DATABASE = "/var/lib/dpkg"
-INSIDE = "ROOM" in os.environ
-
-if INSIDE:
-    sys.path.insert(0, os.path.join(TREE, "tests/e2e"))
-    from clienttest import ClientTest, read, roomclient, stop, unittest, write
-else:
-    import unittest
-    ClientTest = unittest.TestCase
-
-
-def enter_room(package):
-    """Becomes this test in a room in which the directories that the package and dpkg need are writable."""
-    listing = subprocess.run(["dpkg-deb", "--contents", package], capture_output=True, text=True, check=True).stdout
-    shipped = [line.split(maxsplit=5)[5][1:].rstrip("/") for line in listing.splitlines() if line.startswith("d")]
-    writable = [path for path in shipped if path not in ("", "/usr") and os.path.isdir(path)]
-    system = [DATABASE, f"{DATABASE}/info", f"{DATABASE}/triggers", f"{DATABASE}/updates"]
-    command = [f"{TREE}/sandbox/enter", "--platform", "--env", f"CLIENT=/usr/bin/{NAME}",
-               "--env", f"PACKAGE={package}", "--env", "WRITABLE=" + ":".join(writable)]
-    for path in writable + system:
-        command += ["--writable", path]
-    os.execv(command[0], [*command, "/usr/bin/python3", "-B", os.path.abspath(__file__), *sys.argv[1:]])
-
-
-def take_database():
-    """Makes those files of dpkg's database this user's own that dpkg opens for writing or links."""
-    for name in ("lock", "lock-frontend", "triggers/Lock"):
-        with contextlib.suppress(FileNotFoundError):
-            os.unlink(f"{DATABASE}/{name}")
-    shutil.copy(f"{DATABASE}/status", "/tmp/status")
-    os.unlink(f"{DATABASE}/status")
-    shutil.copy("/tmp/status", f"{DATABASE}/status")
-
-
-def dpkg(*arguments):
-    """Runs dpkg as the root of a user namespace."""
-    result = subprocess.run(["unshare", "-r", "dpkg", "--log=/tmp/dpkg.log", *arguments], stdout=subprocess.PIPE,
-                            stderr=subprocess.STDOUT, text=True, check=False)
-    if result.returncode:
-        raise AssertionError(f"dpkg {arguments}: {result.stdout}")
 
 
 def entries():
@@ -115,7 +80,4 @@ class Package(ClientTest):
 
 
 if __name__ == "__main__":
-    if not INSIDE:
-        (built,) = glob.glob(f"{TREE}/build/package/{NAME}_*.deb")
-        enter_room(built)
     unittest.main()

@@ -1,4 +1,5 @@
 #!/usr/bin/python3
+# SPDX-License-Identifier: Apache-2.0
 """What a room keeps from the machine outside, and what it passes on to it."""
 
 import os

@@ -1,12 +1,10 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "filecontent.h"
 
 #include "baseutils.h"
-#include "fileproxy.h"
-#include "filewrite.h"
-#include "paths.h"
 
 #include <QDebug>
-#include <QJsonDocument>
+#include <QJsonObject>
 
 namespace zent::base
 {
@@ -18,12 +16,11 @@ namespace
 /// Nothing when the file cannot be opened.
 std::optional<QJsonObject> readInfoFile(const QString& caller)
 {
-    FileProxy file;
-    if (!file.open(kUserinfoPath, QIODevice::ReadOnly)) {
-        BaseUtils::openFailedLog(caller);
-        return std::nullopt;
-    }
-    return parseInfoObject(file.readAll()).value_or(QJsonObject());
+    const FileReading info = readTerminalInfo(kUserinfoPath, OpenFailure::Logged);
+    if (info.opened)
+        return parseInfoObject(info.content).value_or(QJsonObject());
+    BaseUtils::openFailedLog(caller);
+    return std::nullopt;
 }
 
 template <typename T>
@@ -37,78 +34,72 @@ T readKey(const QString& key, bool* ok, const QString& caller)
     return value;
 }
 
-/// Reads the file for a change. Nothing, with a log line, when it cannot be opened or is not one JSON object: a file
-/// that another component is still writing must not be replaced by what little was understood of it.
-std::optional<QJsonObject> readForChange(const QString& caller)
-{
-    FileProxy file;
-    if (!file.open(kUserinfoPath, QIODevice::ReadOnly)) {
-        BaseUtils::openFailedLog(caller);
-        return std::nullopt;
-    }
-    std::optional<QJsonObject> object = parseInfoObject(file.readAll());
-    if (!object)
-        qWarning() << caller << "parse file failed, file:" << kUserinfoPath;
-    return object;
-}
-
-/// Writes the object back. False, with a log line, when the file cannot be opened (the line names `caller`) or is not
-/// written whole (`logShortWrite` then says so).
+/// Whether the file now holds what it should; otherwise a log line says why not. `logShortWrite` does so for a write
+/// that fell short.
 template <typename LogShortWrite>
-bool writeInfoFile(const QJsonObject& object, const QString& caller, LogShortWrite logShortWrite)
+bool isDone(const InfoChange& change, const QString& caller, LogShortWrite logShortWrite)
 {
-    switch (replaceFile(kUserinfoPath, QJsonDocument(object).toJson())) {
-    case WriteResult::Done:
+    switch (change.state) {
+    case InfoChange::State::Done:
+    case InfoChange::State::Declined:
         return true;
-    case WriteResult::NotOpened:
+    case InfoChange::State::NotOpened:
+    case InfoChange::State::NotWritten:
         BaseUtils::openFailedLog(caller);
         return false;
-    case WriteResult::Short:
+    case InfoChange::State::NotObject:
+        qWarning() << caller << "parse file failed, file:" << kUserinfoPath;
+        return false;
+    case InfoChange::State::Short:
         break;
     }
     logShortWrite();
     return false;
 }
 
-bool writeInfoFile(const QJsonObject& object, const QString& caller, const QString& changedKey)
+bool isDone(const InfoChange& change, const QString& caller, const QString& changedKey)
 {
-    return writeInfoFile(object, caller, [&] { qWarning() << "write value failed, key:" << changedKey; });
+    return isDone(change, caller, [&] { qWarning() << "write value failed, key:" << changedKey; });
 }
 
-/// The value of `key`, or that of `olderKey`, which is then written back under `key`. An older value that is no text
-/// is not written: an empty text in its place could never be told from a missing one again.
+/// The value of `key`, or that of `olderKey`, which is then to be written under `key`. An older value that is no text
+/// is not: an empty text in its place could never be told from a missing one again.
 bool readMigrating(const QJsonObject& object, const QString& key, const QString& olderKey, QString& out,
-                   const QString& caller)
+                   UserInfoReading& reading, const QString& caller)
 {
     if (BaseUtils::getJsonObjectValue(object, key, out, caller))
         return true;
     if (!BaseUtils::getJsonObjectValue(object, olderKey, out, caller))
         return false;
     if (object.value(olderKey).isString())
-        updateUserInfo(key, out);
+        reading.migrated.emplace_back(key, out);
     return true;
 }
 
 } // namespace
 
-std::optional<QJsonObject> parseInfoObject(const QByteArray& content)
+UserInfoReading readUserInfo(const QJsonObject& object, const QString& caller)
 {
-    QJsonParseError error;
-    const QJsonDocument document = QJsonDocument::fromJson(content, &error);
-    if (error.error != QJsonParseError::NoError || !document.isObject())
-        return std::nullopt;
-    return document.object();
+    UserInfoReading reading;
+    UserInfo& info = reading.info;
+    bool& complete = reading.complete;
+    complete &= BaseUtils::getJsonObjectValue(object, infokey::kIsDomain, info.isDomain, caller);
+    complete &= BaseUtils::getJsonObjectValue(object, infokey::kServerHost, info.serverHost, caller);
+    complete &= readMigrating(object, infokey::kDomainHost, infokey::kServerIp, info.domainHost, reading, caller);
+    complete &= readMigrating(object, infokey::kDomainPort, infokey::kServerPort, info.domainPort, reading, caller);
+    complete &= BaseUtils::getJsonObjectValue(object, infokey::kServerPort, info.serverPort, caller);
+    complete &= BaseUtils::getJsonObjectValue(object, infokey::kTerminalName, info.terminalName, caller);
+    return reading;
 }
 
 template <typename T>
 bool updateUserInfo(const QString& key, const T& value)
 {
-    const QString caller = QStringLiteral("updateUserInfo");
-    std::optional<QJsonObject> object = readForChange(caller);
-    if (!object)
-        return false;
-    object->insert(key, value);
-    return writeInfoFile(*object, caller, key);
+    const auto insert = [&](QJsonObject& object) {
+        object.insert(key, value);
+        return true;
+    };
+    return isDone(changeTerminalInfo(insert, OpenFailure::Logged), QStringLiteral("updateUserInfo"), key);
 }
 
 template bool updateUserInfo<QString>(const QString& key, const QString& value);
@@ -121,13 +112,12 @@ FileContent* FileContent::instace()
 
 QString FileContent::getMachineID(bool* ok, bool)
 {
-    FileProxy file;
-    const bool opened = file.open(kMachineidPath, QIODevice::ReadOnly);
-    if (!opened)
+    const FileReading file = readMachineId(OpenFailure::Logged);
+    if (!file.opened)
         BaseUtils::openFailedLog(QStringLiteral("getMachineID"));
     if (ok)
-        *ok = opened;
-    return QString::fromUtf8(file.readAll()).trimmed();
+        *ok = file.opened;
+    return QString::fromUtf8(file.content).trimmed();
 }
 
 bool FileContent::isDomain(bool* ok)
@@ -137,20 +127,22 @@ bool FileContent::isDomain(bool* ok)
 
 bool FileContent::saveDomain(bool value)
 {
-    const QString caller = QStringLiteral("saveDomain");
-    std::optional<QJsonObject> object = readForChange(caller);
-    if (!object)
-        return false;
-    if (!object->contains(infokey::kIsDomain)) {
-        qWarning() << "It is not contain in info file, key:" << infokey::kIsDomain;
-        return false;
-    }
-    if (object->value(infokey::kIsDomain) == QJsonValue(value)) {
-        qInfo() << "value is the same in file, key:" << infokey::kIsDomain;
+    bool known = false;
+    const auto set = [&](QJsonObject& object) {
+        known = object.contains(infokey::kIsDomain);
+        if (!known) {
+            qWarning() << "It is not contain in info file, key:" << infokey::kIsDomain;
+            return false;
+        }
+        if (object.value(infokey::kIsDomain) == QJsonValue(value)) {
+            qInfo() << "value is the same in file, key:" << infokey::kIsDomain;
+            return false;
+        }
+        object.insert(infokey::kIsDomain, value);
         return true;
-    }
-    object->insert(infokey::kIsDomain, value);
-    return writeInfoFile(*object, caller, infokey::kIsDomain);
+    };
+    const InfoChange change = changeTerminalInfo(set, OpenFailure::Logged);
+    return isDone(change, QStringLiteral("saveDomain"), infokey::kIsDomain) && known;
 }
 
 bool FileContent::getHostAndPort(QString& host, QString& port)
@@ -172,20 +164,13 @@ QString FileContent::getTerminalAlias(bool* ok)
 UserInfo FileContent::getUserInfo(bool* ok)
 {
     const QString caller = QStringLiteral("getUserInfo");
-    UserInfo info;
     const std::optional<QJsonObject> object = readInfoFile(caller);
-    bool complete = object.has_value();
-    if (object) {
-        complete &= BaseUtils::getJsonObjectValue(*object, infokey::kIsDomain, info.isDomain, caller);
-        complete &= BaseUtils::getJsonObjectValue(*object, infokey::kServerHost, info.serverHost, caller);
-        complete &= readMigrating(*object, infokey::kDomainHost, infokey::kServerIp, info.domainHost, caller);
-        complete &= readMigrating(*object, infokey::kDomainPort, infokey::kServerPort, info.domainPort, caller);
-        complete &= BaseUtils::getJsonObjectValue(*object, infokey::kServerPort, info.serverPort, caller);
-        complete &= BaseUtils::getJsonObjectValue(*object, infokey::kTerminalName, info.terminalName, caller);
-    }
+    const UserInfoReading reading = object ? readUserInfo(*object, caller) : UserInfoReading{{}, false, {}};
+    for (const auto& [key, value] : reading.migrated)
+        updateUserInfo(key, value);
     if (ok)
-        *ok = complete;
-    return info;
+        *ok = reading.complete;
+    return reading.info;
 }
 
 bool FileContent::saveUserInfo(const UserInfo& info)
@@ -193,7 +178,8 @@ bool FileContent::saveUserInfo(const UserInfo& info)
     const QJsonObject object{{infokey::kIsDomain, info.isDomain},     {infokey::kServerHost, info.serverHost},
                              {infokey::kServerPort, info.serverPort}, {infokey::kDomainHost, info.domainHost},
                              {infokey::kDomainPort, info.domainPort}, {infokey::kTerminalName, info.terminalName}};
-    return writeInfoFile(object, QStringLiteral("saveUserInfo"), [] { qWarning() << "write info json failed"; });
+    return isDone(writeTerminalInfo(object), QStringLiteral("saveUserInfo"),
+                  [] { qWarning() << "write info json failed"; });
 }
 
 } // namespace zent::base

@@ -1,26 +1,16 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <QJsonObject>
+#include "terminalinfo.h"
+
 #include <QObject>
 #include <QString>
 
-#include <optional>
+#include <utility>
+#include <vector>
 
 namespace zent::base
 {
-
-/// Keys of the terminal info file that this store reads and writes.
-namespace infokey
-{
-inline const QString kIsDomain = QStringLiteral("is_Domain");
-inline const QString kServerHost = QStringLiteral("server_host");
-inline const QString kServerPort = QStringLiteral("server_port");
-/// Older name of the domain host, read only to migrate it.
-inline const QString kServerIp = QStringLiteral("server_ip");
-inline const QString kDomainHost = QStringLiteral("domain_host");
-inline const QString kDomainPort = QStringLiteral("domain_port");
-inline const QString kTerminalName = QStringLiteral("terminal_name");
-} // namespace infokey
 
 /// What the terminal info file says.
 struct UserInfo {
@@ -32,8 +22,17 @@ struct UserInfo {
     QString terminalName;
 };
 
-/// The terminal info file's object, or nothing when `content` is not one JSON object.
-std::optional<QJsonObject> parseInfoObject(const QByteArray& content);
+/// What came of reading a record out of an object.
+struct UserInfoReading {
+    UserInfo info;
+    /// Whether no wanted key was missing.
+    bool complete = true;
+    /// Keys that a file of the older form lacks, with the values that it has under their older names.
+    std::vector<std::pair<QString, QString>> migrated;
+};
+
+/// Reads the record; `caller` is named in the log line about each missing key.
+UserInfoReading readUserInfo(const QJsonObject& object, const QString& caller);
 
 /// Changes one key of the terminal info file, adding it when absent. False when the file cannot be opened, is not
 /// one JSON object (it is then left as it is) or cannot be written. Instantiated for QString.
@@ -51,30 +50,28 @@ public:
     static FileContent* instace();
 
     /// The machine identifier without surrounding white space; empty when its file cannot be read. The second flag
-    /// has no meaning on this platform.
+    /// is not used.
     QString getMachineID(bool* ok, bool);
-
-    /// Whether the terminal has joined the domain.
-    bool isDomain(bool* ok);
-
-    /// Stores whether the terminal is in the domain. The key must already be in the file; an equal value is not
-    /// written again. False on any failure.
-    bool saveDomain(bool value);
 
     /// Host and port of the management server; false when either could not be read.
     bool getHostAndPort(QString& host, QString& port);
 
-    /// The terminal's alias as registered with the server.
-    QString getTerminalAlias(bool* ok);
-
-    /// The whole record. A file of the older form is migrated to "domain_host" and "domain_port" on first read.
-    UserInfo getUserInfo(bool* ok);
-
-    /// Replaces the file by the record; false on any failure.
-    bool saveUserInfo(const UserInfo& info);
-
 private:
     FileContent() = default;
+
+    // Agreed with other components, and called by them only.
+public:
+    /// Whether the terminal has joined the domain.
+    bool isDomain(bool* ok);
+    /// Stores whether the terminal is in the domain. The key must already be in the file; an equal value is not
+    /// written again. False on any failure.
+    bool saveDomain(bool value);
+    /// The terminal's alias as registered with the server.
+    QString getTerminalAlias(bool* ok);
+    /// The whole record. A file of the older form is migrated to "domain_host" and "domain_port" on first read.
+    UserInfo getUserInfo(bool* ok);
+    /// Replaces the file by the record; false on any failure.
+    bool saveUserInfo(const UserInfo& info);
 };
 
 } // namespace zent::base

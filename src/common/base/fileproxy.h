@@ -1,4 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
+
+#include "filewrite.h"
 
 #include <QFile>
 #include <QIODevice>
@@ -18,6 +21,10 @@ public:
 
     /// Opens `path` in `mode`; on failure logs path, mode and whether the file exists, and returns false.
     bool open(const QString& path, QIODevice::OpenMode mode);
+    /// The same without the log line.
+    bool openSilently(const QString& path, QIODevice::OpenMode mode);
+    /// Why the file could not be opened.
+    FileError error() const;
 
     /// The whole content from the current position; empty when the file is not open.
     QByteArray readAll();

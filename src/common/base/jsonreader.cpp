@@ -1,7 +1,21 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "jsonreader.h"
 
 namespace zent::base
 {
+
+namespace
+{
+
+constexpr int kLongestIdentifier = 1000;
+
+} // namespace
+
+QString identifierIn(const QJsonValue& value)
+{
+    const QString text = value.toString();
+    return text.size() <= kLongestIdentifier ? text : QString();
+}
 
 JsonReader::JsonReader(const QJsonValue& value) : m_object(value.toObject()), m_good(value.isObject())
 {
@@ -9,7 +23,7 @@ JsonReader::JsonReader(const QJsonValue& value) : m_object(value.toObject()), m_
 
 QJsonValue JsonReader::take(const char* key, QJsonValue::Type type)
 {
-    const QJsonValue value = m_object.value(QLatin1String(key));
+    QJsonValue value = m_object.value(QLatin1String(key));
     m_good = m_good && (value.isUndefined() || value.isNull() || value.type() == type);
     return value;
 }
@@ -22,6 +36,13 @@ bool JsonReader::flag(const char* key)
 QString JsonReader::text(const char* key)
 {
     return take(key, QJsonValue::String).toString();
+}
+
+QString JsonReader::identifier(const char* key)
+{
+    QString whole = text(key);
+    m_good = m_good && whole.size() <= kLongestIdentifier;
+    return whole;
 }
 
 QJsonArray JsonReader::array(const char* key)

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QJsonArray>
@@ -7,8 +8,11 @@
 namespace zent::base
 {
 
-/// Reads values out of a JSON object of somebody else's. A value that is missing or null reads as an empty one; one of
-/// another type than it should have, or no object at all, makes the whole reading bad.
+/// A text that is sent back, written or compared; empty for another type, and for one of over 1,000 characters.
+QString identifierIn(const QJsonValue& value);
+
+/// Reads values from a JSON object that another program wrote. A value that is missing or null reads as an empty one. A
+/// value of a wrong type, or no object at all, makes the whole reading bad.
 class JsonReader
 {
 public:
@@ -16,10 +20,12 @@ public:
 
     bool flag(const char* key);
     QString text(const char* key);
+    /// A text that is sent back, written or compared: one of over 1,000 characters counts as a value of a wrong type.
+    QString identifier(const char* key);
     QJsonArray array(const char* key);
     /// The first text of an array; empty when there is none.
     QString firstText(const char* key);
-    /// An object within, whose own faults are not this one's.
+    /// A nested object. Values of a wrong type inside it do not make this reading bad.
     QJsonObject object(const char* key);
 
     /// Whether everything read so far had its type.

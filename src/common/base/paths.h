@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QString>
@@ -6,7 +7,7 @@
 namespace zent
 {
 
-/// The terminal info file, written by the joining service.
+/// The terminal info file, which other components of the platform write.
 inline const QString kUserinfoPath = QStringLiteral("/etc/zent/userinfo.json");
 /// Staging copy of the terminal info file.
 inline const QString kTmpUserinfoPath = QStringLiteral("/tmp/zent/userinfo.json");
@@ -21,9 +22,9 @@ inline const QString kPublicKeyPath = QStringLiteral("/etc/zent/QEL_Zent.pem");
 inline const QString kPrivateKeyPath = QStringLiteral("/etc/zent/.QEL_Zent.key");
 
 /// Where the server keeps the rule for terminal names; %1 host, %2 port.
-inline const QString kPCRegular = QStringLiteral("https://%1:%2/uim/v3/client/config?key=pc_name_rules");
+inline const QString KPCRegular = QStringLiteral("https://%1:%2/uim/v3/client/config?key=pc_name_rules");
 
-/// What the desktop looked like before the terminal joined management.
+/// Names the modules of the control center: key "ControlCenterList" of the group "config".
 inline const QString kBackupConfigPath = QStringLiteral("/etc/zent/config.ini");
 
 /// The host name, in the desktop's own file.

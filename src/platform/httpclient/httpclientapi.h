@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QObject>
@@ -7,17 +8,14 @@
 
 /// A blocking HTTP client for the management server.
 ///
-/// A request returns when its reply is complete or has failed; no event loop runs meanwhile. Connections are kept alive
-/// and reused by later requests, until the SSL configuration or one of its files changes. Only the configured
-/// certificate authority is trusted, host names are checked and TLS 1.2 is the least version accepted. Redirects are
-/// not followed; proxies and passwords named by the environment are not used.
+/// A request returns when its reply is complete or has failed; no event loop runs meanwhile. It is done in a thread of
+/// its own, which ends after 10 s without a request. Connections are kept until then, until a failure, or until the SSL
+/// configuration or one of its files changes. Only the configured certificate authority is trusted, host names are
+/// checked and TLS 1.2 is the least version accepted. Redirects are not followed; proxies named by the environment are
+/// not used. A POST is never sent twice.
 ///
-/// A host that lets requests time out does not do so poll after poll (HostGuard): after a connect time-out, a silent
-/// name server included, its GETs fail at once until the host answers a connection attempt, which the event loop of
-/// this thread makes in the background; after a reply time-out they do for 2 s, doubling to 60 s, until a request is
-/// answered. POSTs, which a person has started, are always sent. A refused connection costs no time and holds nothing
-/// back. Every GET that fails leaves one log line, sent or not; the polls of a client that was started during an outage
-/// (every 2 s and every 3 s) make 72,000 a day of it, no more than a server that refuses connections does.
+/// A host that lets requests time out, or is slow, does not hold up poll after poll (HostGuard): its polls then fail at
+/// once for a while. Whatever is no poll is always sent. Every request that fails, sent or not, leaves one log line.
 ///
 /// An object belongs to one thread.
 class HttpClientApi : public QObject
@@ -47,9 +45,13 @@ public:
     /// @param url absolute, http or https; port 0 stands for the scheme's default port
     /// @param body sent as JSON when not empty
     /// @param reserved has no effect; callers pass true
-    /// @return the HTTP status whatever it is, or the negated CURLcode when no complete reply came (the log says why);
-    ///     when it was not sent, that of the request that timed out
+    /// @return the HTTP status whatever it is, or the negated QNetworkReply::NetworkError when no complete reply came
+    ///     (the log says why)
     int getRequest(QString& reply, const QString& url, const QString& body, bool reserved);
+
+    /// The same for a request that is repeated until it succeeds. It is not sent while the host is held back. The
+    /// result is then that of the request that timed out, or that of a time-out.
+    int pollRequest(QString& reply, const QString& url, const QString& body);
 
     /// Sends a POST and waits for its reply; parameters and result as with getRequest().
     int postRequest(QString& reply, const QString& url, const QString& body, bool reserved);

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QStringList>
@@ -5,12 +6,11 @@
 class QVariant;
 
 /**
- * What a managed desktop lets its user do. Each setting is a key of the GSettings schema com.vantor.zent.lockdown,
- * which the components of the desktop watch.
+ * What a managed desktop lets its user do. Each setting is a key of the GSettings schema com.vantor.zent.lockdown.
  *
  * Every setter has stored its value for all processes when it returns. It returns false and changes nothing when the
- * schema is not installed (reported once an object, with a warning), does not know the setting (an older one), or the
- * value is locked.
+ * schema is not installed or lacks the setting, or when the value is locked. Each object warns once of a missing
+ * schema.
  */
 class Libzentoxa
 {

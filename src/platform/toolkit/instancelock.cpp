@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "instancelock.h"
 
 #include <QDebug>
@@ -48,7 +49,7 @@ InstanceLock::Result InstanceLock::acquire(const QString& directory, const QStri
 QString InstanceLock::userDirectory()
 {
     // XDG_RUNTIME_DIR may differ between two starts of the same user (su, cron), so the real folder comes first.
-    const QString directory = QStringLiteral("/run/user/%1").arg(::getuid());
+    QString directory = QStringLiteral("/run/user/%1").arg(::getuid());
     struct stat info = {};
     if (::lstat(QFile::encodeName(directory).constData(), &info) == 0 && S_ISDIR(info.st_mode) &&
         info.st_uid == ::getuid())

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QString>
@@ -5,9 +6,8 @@
 /**
  * A lock file that one process at a time can hold.
  *
- * The lock belongs to the open file, so the kernel releases it however the holder ends, and programs that the
- * holder starts do not inherit it. The file itself stays behind: removing it would let two processes lock two
- * files of the same name.
+ * The kernel releases the lock however the holder ends. Programs that the holder starts do not inherit it. The file
+ * itself stays behind: removing it would let two processes lock two files of the same name.
  */
 class InstanceLock
 {
@@ -26,8 +26,8 @@ public:
     /// Tries to lock the file for @p key in @p directory without waiting. Holding it already counts as acquired.
     Result acquire(const QString& directory, const QString& key);
 
-    /// The folder for this user's locks: /run/user/<uid> where it exists and belongs to the user, else Qt's run-time
-    /// folder, which is empty when Qt cannot provide one. The environment cannot move the former.
+    /// The folder for this user's locks: /run/user/<uid> where it exists and belongs to the user, whatever the
+    /// environment says. Else Qt's run-time folder, which is empty when Qt cannot provide one.
     static QString userDirectory();
 
     /// The path of the lock file; every character of @p key that could leave @p directory is percent-encoded.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "themehelper.h"
 
 #include <QDBusConnection>
@@ -12,11 +13,11 @@
 namespace
 {
 
-const QString portalService = QStringLiteral("org.freedesktop.portal.Desktop");
-const QString portalPath = QStringLiteral("/org/freedesktop/portal/desktop");
-const QString settingsInterface = QStringLiteral("org.freedesktop.portal.Settings");
-const QString appearance = QStringLiteral("org.freedesktop.appearance");
-const QString colorSchemeKey = QStringLiteral("color-scheme");
+const QString kPortalService = QStringLiteral("org.freedesktop.portal.Desktop");
+const QString kPortalPath = QStringLiteral("/org/freedesktop/portal/desktop");
+const QString kSettingsInterface = QStringLiteral("org.freedesktop.portal.Settings");
+const QString kAppearance = QStringLiteral("org.freedesktop.appearance");
+const QString kColorSchemeKey = QStringLiteral("color-scheme");
 
 ThemeHelper::ColorType paletteType()
 {
@@ -60,12 +61,12 @@ void ThemeHelper::watch()
     QDBusConnection bus = QDBusConnection::sessionBus();
     if (!bus.isConnected())
         return;
-    // No service name in the match: with one, the connection would ask the bus for its owner and wait.
-    bus.connect(QString(), portalPath, settingsInterface, QStringLiteral("SettingChanged"), this,
+    // The match names no service: with one, the connection would ask the bus for its owner and wait.
+    bus.connect(QString(), kPortalPath, kSettingsInterface, QStringLiteral("SettingChanged"), this,
                 SLOT(onSettingChanged(QString, QString, QDBusVariant)));
     QDBusMessage read =
-        QDBusMessage::createMethodCall(portalService, portalPath, settingsInterface, QStringLiteral("Read"));
-    read << appearance << colorSchemeKey;
+        QDBusMessage::createMethodCall(kPortalService, kPortalPath, kSettingsInterface, QStringLiteral("Read"));
+    read << kAppearance << kColorSchemeKey;
     auto* watcher = new QDBusPendingCallWatcher(bus.asyncCall(read), this);
     connect(watcher, &QDBusPendingCallWatcher::finished, this, &ThemeHelper::onPortalAnswer);
 }
@@ -73,14 +74,14 @@ void ThemeHelper::watch()
 void ThemeHelper::onPortalAnswer(QDBusPendingCallWatcher* watcher)
 {
     watcher->deleteLater();
-    // No portal, or one without this setting, is an ordinary desktop: the palette decides.
+    // A desktop may have no portal, or one without this setting. The palette then decides.
     if (!watcher->isError() && !watcher->reply().arguments().isEmpty())
         setPortalType(watcher->reply().arguments().constFirst());
 }
 
 void ThemeHelper::onSettingChanged(const QString& nameSpace, const QString& key, const QDBusVariant& value)
 {
-    if (nameSpace == appearance && key == colorSchemeKey)
+    if (nameSpace == kAppearance && key == kColorSchemeKey)
         setPortalType(value.variant());
 }
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QObject>
@@ -7,8 +8,8 @@ class QDBusPendingCallWatcher;
 class QDBusVariant;
 
 /**
- * Tells whether the desktop uses a light or a dark theme: what the desktop portal says, else what the application's
- * palette looks like. The session bus is not touched before somebody asks or connects to the signal.
+ * Tells whether the desktop's theme is light or dark. It asks the desktop portal, else looks at the application's
+ * palette. The session bus is not used before somebody asks or connects to the signal.
  */
 class ThemeHelper : public QObject
 {

@@ -1,5 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitapplication.h"
 
+#include "accessibilityguard.h"
 #include "instancelock.h"
 
 #include <QDebug>
@@ -9,7 +11,7 @@
 namespace
 {
 
-const char platformVariable[] = "QT_QPA_PLATFORM";
+const char kPlatformVariable[] = "QT_QPA_PLATFORM";
 bool platformChosenHere = false;
 
 void substituteFonts()
@@ -30,23 +32,24 @@ void ToolkitApplication::loadPlatformPlugin()
 {
     QCoreApplication::setAttribute(Qt::AA_EnableHighDpiScaling);
     QCoreApplication::setAttribute(Qt::AA_UseHighDpiPixmaps);
-    if (qEnvironmentVariableIsEmpty("DISPLAY") || qEnvironmentVariableIsSet(platformVariable))
+    if (qEnvironmentVariableIsEmpty("DISPLAY") || qEnvironmentVariableIsSet(kPlatformVariable))
         return;
-    // The second name is for a DISPLAY that nobody serves any more.
-    qputenv(platformVariable, "xcb;wayland");
+    // The second plugin is for a DISPLAY whose server has gone.
+    qputenv(kPlatformVariable, "xcb;wayland");
     platformChosenHere = true;
 }
 
 ToolkitApplication::ToolkitApplication(int& argc, char** argv) : QApplication(argc, argv)
 {
     if (platformChosenHere) {
-        // The choice is this program's own; what it starts decides for itself.
-        qunsetenv(platformVariable);
+        // Programs that this one starts choose their own plugin.
+        qunsetenv(kPlatformVariable);
         platformChosenHere = false;
     }
     substituteFonts();
+    new AccessibilityGuard(this);
     setFallbackSessionManagementEnabled(false);
-    // Direct: the answer must be given before the signal returns.
+    // Direct, because the session manager needs the answer before the signal returns.
     const auto neverRestart = [](QSessionManager& manager) { manager.setRestartHint(QSessionManager::RestartNever); };
     connect(this, &QGuiApplication::commitDataRequest, this, neverRestart, Qt::DirectConnection);
     connect(this, &QGuiApplication::saveStateRequest, this, neverRestart, Qt::DirectConnection);

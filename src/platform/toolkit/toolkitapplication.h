@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QApplication>
@@ -8,8 +9,8 @@
 class InstanceLock;
 
 /**
- * The application object of a desktop program: a QApplication that prefers the X platform plugin, knows substitutes
- * for the fonts that windows ask for, runs once per user, and is never restarted by the session manager.
+ * The application object of a desktop program. It prefers the X platform plugin, knows substitutes for the fonts that
+ * windows ask for, and runs once per user. The session manager never restarts it.
  */
 class ToolkitApplication : public QApplication
 {

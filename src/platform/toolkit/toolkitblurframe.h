@@ -1,14 +1,17 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QColor>
 #include <QWidget>
 
+class RoundedFrame;
+
 /**
  * A rounded, frameless surface that lets a blurred desktop shine through where the window manager can do that.
  *
- * As a window it is translucent with smooth corners under a compositing manager, and opaque and cut to shape without
- * one; Esc closes it, and Return presses the button that has the focus. As a child it is a rounded panel. Its children
- * get a palette that suits the mask colour, whatever the desktop's theme.
+ * As a window it is opaque and cut to shape without a compositing manager. Esc closes it, and Return presses the button
+ * that has the focus. As a child it is a rounded panel. Its children get a palette that suits the mask colour, whatever
+ * the desktop's theme.
  */
 class ToolkitBlurFrame : public QWidget
 {
@@ -26,21 +29,14 @@ public:
     void setMaskAlpha(int alpha);
 
     /// The corner radius in pixels. 12 at first.
-    int radius() const { return m_radius; }
+    int radius() const;
     void setRadius(int radius);
 
 protected:
-    bool event(QEvent* event) override;
-    void keyPressEvent(QKeyEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
-    void resizeEvent(QResizeEvent* event) override;
 
 private:
-    void updateShape();
-    void updateBlur();
-
+    RoundedFrame* m_frame;
     QColor m_maskColor;
     int m_maskAlpha = 230;
-    int m_radius = 12;
-    bool m_composited = false;
 };

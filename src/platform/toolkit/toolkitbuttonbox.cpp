@@ -1,4 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitbuttonbox.h"
+
+#include "focusring.h"
 
 #include <QButtonGroup>
 #include <QHBoxLayout>
@@ -7,8 +10,8 @@
 namespace
 {
 
-constexpr qreal trackRadius = 8;
-constexpr qreal plateInset = 3;
+constexpr qreal kTrackRadius = 8;
+constexpr qreal kPlateInset = 3;
 
 QColor withAlpha(QColor color, int alpha)
 {
@@ -38,8 +41,8 @@ void ToolkitButtonBoxButton::paintEvent(QPaintEvent*)
     painter.setRenderHint(QPainter::Antialiasing);
     const QColor ink = palette().color(QPalette::WindowText);
     const QColor accent = palette().color(QPalette::Link);
-    const QRectF plate = QRectF(rect()).adjusted(plateInset, plateInset, -plateInset, -plateInset);
-    const qreal radius = trackRadius - 2;
+    const QRectF plate = QRectF(rect()).adjusted(kPlateInset, kPlateInset, -kPlateInset, -kPlateInset);
+    const qreal radius = kTrackRadius - 2;
 
     if (isChecked() || isDown()) {
         painter.setPen(Qt::NoPen);
@@ -53,11 +56,7 @@ void ToolkitButtonBoxButton::paintEvent(QPaintEvent*)
         painter.setBrush(withAlpha(ink, 14));
         painter.drawRoundedRect(plate, radius, radius);
     }
-    if (hasFocus() && window()->testAttribute(Qt::WA_KeyboardFocusChange)) {
-        painter.setPen(QPen(accent, 2));
-        painter.setBrush(Qt::NoBrush);
-        painter.drawRoundedRect(plate.adjusted(1, 1, -1, -1), radius - 1, radius - 1);
-    }
+    focusring::paint(painter, this, plate, radius);
     QFont textFont = font();
     if (isChecked())
         textFont.setWeight(QFont::DemiBold);
@@ -95,7 +94,7 @@ void ToolkitButtonBox::setButtonList(const QList<QAbstractButton*>& buttons, boo
 void ToolkitButtonBox::addButton(QAbstractButton* button)
 {
     button->setCheckable(m_checkable);
-    // The group makes them exclusive anyway; this makes them radio buttons to assistive programs.
+    // The group makes them exclusive already. This makes them radio buttons to assistive programs.
     button->setAutoExclusive(m_checkable);
     m_group->addButton(button);
     m_layout->addWidget(button);
@@ -117,5 +116,5 @@ void ToolkitButtonBox::paintEvent(QPaintEvent*)
     painter.setRenderHint(QPainter::Antialiasing);
     painter.setPen(Qt::NoPen);
     painter.setBrush(withAlpha(palette().color(QPalette::WindowText), 18));
-    painter.drawRoundedRect(rect(), trackRadius, trackRadius);
+    painter.drawRoundedRect(rect(), kTrackRadius, kTrackRadius);
 }

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QAbstractButton>
@@ -21,8 +22,8 @@ protected:
 };
 
 /**
- * A segmented control: buttons side by side on one track, of which at most one is checked. With the keyboard it is
- * one stop in the tab order; the arrow keys move between its segments.
+ * A segmented control: buttons in a row on one track, of which at most one is checked. Tab stops at the control once;
+ * the arrow keys move between its segments.
  */
 class ToolkitButtonBox : public QWidget
 {

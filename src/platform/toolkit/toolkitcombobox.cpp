@@ -1,5 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitcombobox.h"
 
+#include "focusring.h"
 #include "toolkitlabel.h"
 
 #include <QAbstractItemView>
@@ -10,9 +12,9 @@
 namespace
 {
 
-constexpr int textMargin = 12;
-constexpr int arrowRoom = 30;
-constexpr qreal frameRadius = 6;
+constexpr int kTextMargin = 12;
+constexpr int kArrowRoom = 30;
+constexpr qreal kFrameRadius = 6;
 
 } // namespace
 
@@ -23,13 +25,12 @@ ToolkitComboBox::ToolkitComboBox(QWidget* parent) : QComboBox(parent)
 
 QRect ToolkitComboBox::textRect() const
 {
-    return rect().adjusted(textMargin, 0, -arrowRoom, 0);
+    return rect().adjusted(kTextMargin, 0, -kArrowRoom, 0);
 }
 
 void ToolkitComboBox::showPopup()
 {
-    // The list is a window of its own, which takes its colours from the application, and so does a palette that is
-    // merely inherited: every colour has to be set.
+    // The list is a window of its own, which inherits no colours from this widget. Every colour has to be set.
     QPalette colors = palette();
     for (int role = 0; role < QPalette::NColorRoles; ++role) {
         for (const QPalette::ColorGroup group : {QPalette::Active, QPalette::Inactive, QPalette::Disabled})
@@ -57,12 +58,10 @@ void ToolkitComboBox::paintEvent(QPaintEvent*)
     QColor ink = palette().color(QPalette::Text);
     QColor edge = ink;
     edge.setAlpha(isEnabled() && underMouse() ? 90 : 50);
-    const bool focused = hasFocus() && window()->testAttribute(Qt::WA_KeyboardFocusChange);
-    const qreal width = focused ? 2 : 1;
-    painter.setPen(QPen(focused ? palette().color(QPalette::Highlight) : edge, width));
+    painter.setPen(QPen(edge, 1));
     painter.setBrush(palette().color(QPalette::Base));
-    painter.drawRoundedRect(QRectF(rect()).adjusted(width / 2, width / 2, -width / 2, -width / 2), frameRadius,
-                            frameRadius);
+    painter.drawRoundedRect(QRectF(rect()).adjusted(0.5, 0.5, -0.5, -0.5), kFrameRadius, kFrameRadius);
+    focusring::paint(painter, this, rect(), kFrameRadius);
 
     painter.setPen(ink);
     painter.drawText(textRect(), Qt::AlignLeft | Qt::AlignVCenter,
@@ -70,6 +69,6 @@ void ToolkitComboBox::paintEvent(QPaintEvent*)
 
     ink.setAlpha(150);
     painter.setPen(QPen(ink, 1.5, Qt::SolidLine, Qt::RoundCap, Qt::RoundJoin));
-    painter.translate(this->width() - arrowRoom / 2.0, height() / 2.0);
+    painter.translate(width() - kArrowRoom / 2.0, height() / 2.0);
     painter.drawPolyline(QPolygonF({QPointF(-4, -2), QPointF(0, 2), QPointF(4, -2)}));
 }

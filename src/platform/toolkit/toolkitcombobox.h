@@ -1,10 +1,10 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QComboBox>
 
 /**
- * A combo box with the toolkit's quiet frame. A current text too long for it is shown elided, and whole as the
- * combo box's tool tip.
+ * A combo box with the toolkit's quiet frame. It elides a current text that is too long; its tool tip shows all of it.
  */
 class ToolkitComboBox : public QComboBox
 {

@@ -1,70 +1,99 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitdialog.h"
 
-#include "roundedsurface.h"
-#include "toolkitlabel.h"
+#include "messagelabel.h"
+#include "roundedframe.h"
 #include "toolkitsuggestbutton.h"
 #include "toolkittitlebar.h"
 #include "toolkitwarningbutton.h"
-#include "windowkeys.h"
 #include "windowmanagerhelper.h"
 
-#include <QKeyEvent>
+#include <QApplication>
+#include <QEvent>
+#include <QPainter>
 #include <QPointer>
+#include <QScreen>
+#include <QTimer>
 #include <QVBoxLayout>
 
 namespace
 {
 
-constexpr int cornerRadius = 12;
-constexpr int titlebarHeight = 50;
-constexpr int bodyMargin = 10;
-constexpr int narrowestMessage = 280;
-constexpr int widestMessage = 420;
-constexpr int longestMessage = 1000;
-constexpr int messageLines = 20;
-constexpr Qt::WindowFlags frameFlags = Qt::Dialog | Qt::FramelessWindowHint;
+constexpr int kCornerRadius = 12;
+constexpr int kTitlebarHeight = 50;
+constexpr int kBodyMargin = 10;
+constexpr Qt::WindowFlags kFrameFlags = Qt::Dialog | Qt::FramelessWindowHint;
 
-/// A message fit for a label: of bounded length, and with places to break words too long for a line.
-QString displayText(const QString& message)
+/// The sign of a warning, or of a critical message.
+QPixmap sign(ToolkitDialog::BoxKind kind)
 {
-    constexpr int longestWord = 24;
-    constexpr ushort zeroWidthSpace = 0x200b;
-    QString shown;
-    int lines = 1;
-    int word = 0;
-    for (const QChar character : message.left(longestMessage)) {
-        if (character == QLatin1Char('\n') && ++lines > messageLines)
-            break;
-        word = character.isSpace() ? 0 : word + 1;
-        if (word > longestWord && !character.isLowSurrogate() && !character.isMark()) {
-            shown += QChar(zeroWidthSpace);
-            word = 1;
-        }
-        shown += character;
+    QPixmap pixmap(64, 64);
+    pixmap.fill(Qt::transparent);
+    QPainter painter(&pixmap);
+    painter.setRenderHint(QPainter::Antialiasing);
+    painter.scale(2, 2);
+    const bool critical = kind == ToolkitDialog::CriticalBox;
+    // These colours stand out on light and on dark.
+    const QColor face = critical ? QColor(0xe5, 0x39, 0x35) : QColor(0xc9, 0x6a, 0x00);
+    painter.setBrush(face);
+    painter.setPen(QPen(face, 4, Qt::SolidLine, Qt::RoundCap, Qt::RoundJoin));
+    if (critical)
+        painter.drawEllipse(QPointF(16, 16), 13, 13);
+    else
+        painter.drawPolygon(QPolygonF({QPointF(16, 5), QPointF(29, 27), QPointF(3, 27)}));
+    painter.setPen(QPen(Qt::white, 3, Qt::SolidLine, Qt::RoundCap));
+    if (critical) {
+        painter.drawLine(QPointF(11, 11), QPointF(21, 21));
+        painter.drawLine(QPointF(11, 21), QPointF(21, 11));
+    } else {
+        painter.drawLine(QPointF(16, 12), QPointF(16, 18));
+        painter.drawPoint(QPointF(16, 24));
     }
-    return lines > messageLines || message.size() > longestMessage ? shown + QChar(0x2026) : shown;
+    return pixmap;
+}
+
+/// Puts a dialog in the middle of another window. Qt would leave room above it for a frame, which it has not.
+void placeOver(QWidget& dialog, const QWidget& window)
+{
+    dialog.adjustSize();
+    const QRect room = window.screen()->availableGeometry();
+    QRect place = dialog.rect();
+    place.moveCenter(window.geometry().center());
+    place.moveRight(qMin(place.right(), room.right()));
+    place.moveBottom(qMin(place.bottom(), room.bottom()));
+    dialog.move(qMax(place.left(), room.left()), qMax(place.top(), room.top()));
+}
+
+constexpr int kKeyboardSettlesMs = 200;
+
+/// Some window managers give the keyboard back only to windows that are in the task bar. The request waits until they
+/// have seen the dialog go: openbox answers an earlier one and then takes the keyboard away again.
+void giveKeyboardTo(QWidget* window)
+{
+    QTimer::singleShot(kKeyboardSettlesMs, window, [window] {
+        if (!window->isVisible() || QApplication::activeWindow())
+            return;
+        WindowManagerHelper::takePresentTime();
+        window->activateWindow();
+    });
 }
 
 } // namespace
 
 ToolkitDialog::ToolkitDialog(QWidget* parent)
-    : QDialog(parent, frameFlags), m_titlebar(new ToolkitTitlebar(this)), m_messageLabel(new ToolkitLabel(this)),
-      m_contentLayout(new QVBoxLayout), m_buttonLayout(new QHBoxLayout)
+    : QDialog(parent, kFrameFlags), m_frame(new RoundedFrame(this, kCornerRadius)),
+      m_titlebar(new ToolkitTitlebar(this)), m_message(new MessageLabel(this)), m_contentLayout(new QVBoxLayout),
+      m_buttonLayout(new QHBoxLayout)
 {
-    setAttribute(Qt::WA_TranslucentBackground);
-    m_titlebar->setFixedHeight(titlebarHeight);
+    m_titlebar->setFixedHeight(kTitlebarHeight);
     m_titlebar->setBackgroundTransparent(true);
-    m_messageLabel->setObjectName(QStringLiteral("messageLabel"));
-    m_messageLabel->setWordWrap(true);
-    m_messageLabel->setAlignment(Qt::AlignHCenter | Qt::AlignVCenter);
-    m_messageLabel->hide();
-    m_contentLayout->setSpacing(bodyMargin);
-    m_buttonLayout->setSpacing(bodyMargin);
+    m_contentLayout->setSpacing(kBodyMargin);
+    m_buttonLayout->setSpacing(kBodyMargin);
 
     auto* body = new QVBoxLayout;
-    body->setContentsMargins(bodyMargin, 0, bodyMargin, 0);
+    body->setContentsMargins(kBodyMargin, 0, kBodyMargin, 0);
     body->setSpacing(0);
-    body->addWidget(m_messageLabel, 0, Qt::AlignHCenter);
+    body->addWidget(m_message, 0, Qt::AlignHCenter);
     body->addLayout(m_contentLayout, 1);
     body->addLayout(m_buttonLayout);
 
@@ -73,8 +102,8 @@ ToolkitDialog::ToolkitDialog(QWidget* parent)
     layout->setSpacing(0);
     layout->addWidget(m_titlebar);
     layout->addLayout(body, 1);
-    // A margin that gives way before the content of a dialog of fixed size is cut.
-    layout->addSpacerItem(new QSpacerItem(0, bodyMargin, QSizePolicy::Minimum, QSizePolicy::Maximum));
+    // This margin shrinks before the content of a dialog of fixed size is cut.
+    layout->addSpacerItem(new QSpacerItem(0, kBodyMargin, QSizePolicy::Minimum, QSizePolicy::Maximum));
 
     updateSurface();
     connect(ThemeHelper::instance(), &ThemeHelper::themeTypeChanged, this, &ToolkitDialog::updateSurface);
@@ -92,31 +121,41 @@ void ToolkitDialog::setTitle(const QString& title)
 
 void ToolkitDialog::setMessage(const QString& message)
 {
-    m_message = message;
-    m_messageLabel->setText(displayText(message));
-    m_messageLabel->setVisible(!message.isEmpty());
+    m_message->setMessage(message);
     updateAccessibleTexts();
-    updateMessageSize();
+}
+
+QString ToolkitDialog::message() const
+{
+    return m_message->message();
+}
+
+void ToolkitDialog::tell(QWidget* parent, const QString& text, const QString& title, BoxKind kind)
+{
+    // On the heap, because the parent deletes the box when it goes away meanwhile.
+    const QPointer<ToolkitDialog> box = new ToolkitDialog(parent);
+    if (kind == WarningBox || kind == CriticalBox)
+        box->setIcon(sign(kind));
+    box->setTitle(title);
+    box->setMessage(text);
+    if (kind == BareBox)
+        // As much room below the text as the title bar takes above it.
+        box->layout()->setContentsMargins(0, 0, 0, kTitlebarHeight - kBodyMargin);
+    else
+        box->addButton(QStringLiteral("确定"), true, ButtonRecommend);
+    if (parent)
+        placeOver(*box, *parent->window());
+    box->exec();
+    delete box;
 }
 
 void ToolkitDialog::updateAccessibleTexts()
 {
-    // A screen reader announces a window by its name: without a title it is the message that says what this is about.
-    if (m_message.isEmpty())
+    // A screen reader announces a window by its name. Without a title, the message says what this is about.
+    if (message().isEmpty())
         return;
-    setAccessibleName(windowTitle().isEmpty() ? m_message : windowTitle());
-    setAccessibleDescription(windowTitle().isEmpty() ? QString() : m_message);
-}
-
-void ToolkitDialog::updateMessageSize()
-{
-    // A wrapped label tells a window's layout its height for one width only, so both are settled here.
-    const QFontMetrics metrics = m_messageLabel->fontMetrics();
-    const int wanted = metrics.size(0, m_messageLabel->text()).width() + 2;
-    const int width = qBound(narrowestMessage, wanted, widestMessage);
-    const QRect area(0, 0, width, QWIDGETSIZE_MAX);
-    const QRect needed = metrics.boundingRect(area, Qt::AlignHCenter | Qt::TextWordWrap, m_messageLabel->text());
-    m_messageLabel->setFixedSize(width, needed.height() + 2 * bodyMargin);
+    setAccessibleName(windowTitle().isEmpty() ? message() : windowTitle());
+    setAccessibleDescription(windowTitle().isEmpty() ? QString() : message());
 }
 
 int ToolkitDialog::addButton(const QString& text, bool isDefault, ButtonType type)
@@ -139,7 +178,7 @@ int ToolkitDialog::addButton(const QString& text, bool isDefault, ButtonType typ
     button->setDefault(isDefault);
     button->setSizePolicy(QSizePolicy::Expanding, QSizePolicy::Fixed);
     if (m_buttons.isEmpty())
-        m_buttonLayout->setContentsMargins(0, bodyMargin, 0, 0);
+        m_buttonLayout->setContentsMargins(0, kBodyMargin, 0, 0);
     m_buttonLayout->addWidget(button);
     const int index = m_buttons.size();
     m_buttons.append(button);
@@ -172,15 +211,18 @@ void ToolkitDialog::updateSurface()
 void ToolkitDialog::setVisible(bool visible)
 {
     if (visible) {
-        // A caller's setWindowFlags() may have left out the frame's own, even the one that makes this a window.
-        if ((windowFlags() & frameFlags) != frameFlags)
-            setWindowFlags(windowFlags() | frameFlags);
+        // A caller's setWindowFlags() may have left out the frame's flags, even the one that makes this a window.
+        if ((windowFlags() & kFrameFlags) != kFrameFlags)
+            setWindowFlags(windowFlags() | kFrameFlags);
         const QList<QPushButton*> buttons = findChildren<QPushButton*>();
         for (QPushButton* button : buttons)
             button->setAutoDefault(false);
         focusFirst();
     }
+    const bool hadKeyboard = isActiveWindow();
     QDialog::setVisible(visible);
+    if (!visible && hadKeyboard && parentWidget())
+        giveKeyboardTo(parentWidget()->window());
 }
 
 void ToolkitDialog::focusFirst()
@@ -211,44 +253,13 @@ bool ToolkitDialog::event(QEvent* event)
         if (testAttribute(Qt::WA_SetWindowIcon))
             m_titlebar->setIcon(windowIcon());
         break;
-    case QEvent::FontChange:
-        updateMessageSize();
-        break;
-    case QEvent::Show:
-        updateShape();
-        break;
-    case QEvent::WinIdChange:
-        if (isVisible())
-            updateShape();
-        break;
     default:
         break;
     }
     return handled;
 }
 
-void ToolkitDialog::keyPressEvent(QKeyEvent* event)
-{
-    if (!windowkeys::handle(this, event))
-        QDialog::keyPressEvent(event);
-}
-
-void ToolkitDialog::resizeEvent(QResizeEvent* event)
-{
-    QDialog::resizeEvent(event);
-    if (isVisible())
-        updateShape();
-}
-
-void ToolkitDialog::updateShape()
-{
-    m_composited = roundedsurface::applyShape(this, cornerRadius);
-}
-
 void ToolkitDialog::paintEvent(QPaintEvent*)
 {
-    // A compositing manager that starts or stops exposes the windows: the place to notice it without a watcher.
-    if (m_composited != WindowManagerHelper::instance()->hasComposite())
-        QMetaObject::invokeMethod(this, &ToolkitDialog::updateShape, Qt::QueuedConnection);
-    roundedsurface::paint(this, palette().color(QPalette::Window), cornerRadius, !m_composited);
+    m_frame->paint(palette().color(QPalette::Window));
 }

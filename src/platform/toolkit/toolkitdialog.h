@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include "themehelper.h"
@@ -6,9 +7,10 @@
 #include <QIcon>
 #include <QList>
 
+class MessageLabel;
 class QAbstractButton;
 class QBoxLayout;
-class ToolkitLabel;
+class RoundedFrame;
 class ToolkitTitlebar;
 
 /**
@@ -27,6 +29,10 @@ public:
     enum ButtonType { ButtonNormal, ButtonRecommend, ButtonWarning };
     Q_ENUM(ButtonType)
 
+    /// The kinds of message boxes: with the button "确定", with a sign before the title as well, and without a button.
+    enum BoxKind { NoticeBox, WarningBox, CriticalBox, BareBox };
+    Q_ENUM(BoxKind)
+
     explicit ToolkitDialog(QWidget* parent = nullptr);
 
     /// Sets the window's icon, which the title bar shows too.
@@ -35,9 +41,13 @@ public:
     /// Sets the window's title, which the title bar shows too.
     void setTitle(const QString& title);
 
-    /// The text below the title bar, shown literally, wrapped, and cut after some 20 lines; hidden while empty.
+    /// The text below the title bar. It is shown literally, wrapped, selectable, and cut after 20 lines; an empty one
+    /// is hidden.
     void setMessage(const QString& message);
-    QString message() const { return m_message; }
+    QString message() const;
+
+    /// Shows a modal message box and returns when it is closed. The parent may go away meanwhile.
+    static void tell(QWidget* parent, const QString& text, const QString& title = QString(), BoxKind kind = NoticeBox);
 
     /// Appends a button with a literal text; a default button answers to Return. Returns its index. A click emits
     /// buttonClicked(), then ends the dialog with done(index).
@@ -55,28 +65,23 @@ public:
     void setVisible(bool visible) override;
 
 signals:
-    /// A button was clicked. The dialog's result cannot tell the first button from a closed dialog; this can.
+    /// A button was clicked. The dialog's result alone cannot tell the first button from a closed dialog.
     void buttonClicked(int index, const QString& text);
 
 protected:
     bool event(QEvent* event) override;
-    void keyPressEvent(QKeyEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
-    void resizeEvent(QResizeEvent* event) override;
 
 private:
     void updateSurface();
-    void updateShape();
-    void updateMessageSize();
     void updateAccessibleTexts();
     void focusFirst();
 
+    RoundedFrame* m_frame;
     ToolkitTitlebar* m_titlebar;
-    ToolkitLabel* m_messageLabel;
+    MessageLabel* m_message;
     QBoxLayout* m_contentLayout;
     QBoxLayout* m_buttonLayout;
     QList<QAbstractButton*> m_buttons;
-    QString m_message;
     ThemeHelper::ColorType m_surface = ThemeHelper::UnknownType;
-    bool m_composited = false;
 };

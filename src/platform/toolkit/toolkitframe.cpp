@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitframe.h"
 
 #include <QPainter>
@@ -10,8 +11,8 @@ void ToolkitFrame::paintEvent(QPaintEvent* event)
 {
     if (frameShape() != QFrame::HLine && frameShape() != QFrame::VLine)
         return QFrame::paintEvent(event);
-    constexpr int lineAlpha = 40;
+    constexpr int kLineAlpha = 40;
     QColor color = palette().color(QPalette::WindowText);
-    color.setAlpha(lineAlpha);
+    color.setAlpha(kLineAlpha);
     QPainter(this).fillRect(rect(), color);
 }

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitlabel.h"
 
 #include <QFontInfo>
@@ -22,13 +23,13 @@ QString ToolkitLabel::plainToolTip(const QString& text)
     if (!Qt::mightBeRichText(text))
         return text;
     const QString escaped = text.toHtmlEscaped();
-    // Escaped text is shown escaped unless the tool tip takes it for rich text.
+    // A tool tip that does not take the text for rich text would show the escapes.
     return Qt::mightBeRichText(escaped) ? escaped : QStringLiteral("<qt>") + escaped + QStringLiteral("</qt>");
 }
 
 void ToolkitLabel::shrinkFontToWidth()
 {
-    // Measuring loads the fonts, which cost more than everything else in a client whose panel nobody has opened.
+    // Measuring loads the fonts, which a program does not need before it shows a window.
     m_shrinkWhenShown = !isVisible();
     if (!m_shrinkWhenShown)
         shrinkNow();
@@ -36,10 +37,10 @@ void ToolkitLabel::shrinkFontToWidth()
 
 void ToolkitLabel::shrinkNow()
 {
-    constexpr int smallest = 8;
+    constexpr int kSmallest = 8;
     QFont smaller = font();
     for (int size = QFontInfo(smaller).pixelSize();
-         size > smallest && QFontMetrics(smaller).horizontalAdvance(text()) > contentsRect().width();) {
+         size > kSmallest && QFontMetrics(smaller).horizontalAdvance(text()) > contentsRect().width();) {
         smaller.setPixelSize(--size);
     }
     if (smaller != font())
@@ -51,7 +52,7 @@ int ToolkitLabel::baseline() const
     const QRect area = contentsRect();
     const QFontMetrics metrics = fontMetrics();
     int line = style()->itemTextRect(metrics, area, int(alignment()), true, text()).top() + metrics.ascent();
-    // Measured on glyphs that reach low and high, not on the text, so that neighbouring labels keep one baseline.
+    // Measured on tall and deep glyphs, not on the text, so that neighbouring labels keep one baseline.
     const int low = line + metrics.tightBoundingRect(QStringLiteral("gj()")).bottom() - area.bottom();
     const int high = line + metrics.tightBoundingRect(QStringLiteral("年国(")).top() - area.top();
     if (low > 0)
@@ -94,24 +95,24 @@ void ToolkitLabel::paintEvent(QPaintEvent* event)
 {
     if (text().isEmpty() || wordWrap() || text().contains(QLatin1Char('\n')))
         return QLabel::paintEvent(event);
-    constexpr int slices = 14;
-    constexpr int sliceWidth = 2;
+    constexpr int kSlices = 14;
+    constexpr int kSliceWidth = 2;
     QPainter painter(this);
     QColor color = palette().color(isEnabled() ? QPalette::Active : QPalette::Disabled, foregroundRole());
     painter.setPen(color);
     if (!overflows())
         return drawLine(painter);
 
-    // In slices: a gradient pen draws glyphs as outlines, and a layer blends them differently; both look bolder than
-    // the text around.
+    // In slices: a gradient pen draws glyphs as outlines, and a layer blends them differently. Both look bolder than
+    // the text around them.
     const QRect area = contentsRect();
-    const int fadeStart = area.right() + 1 - slices * sliceWidth;
+    const int fadeStart = area.right() + 1 - kSlices * kSliceWidth;
     const int alpha = color.alpha();
-    for (int slice = 0; slice <= slices; ++slice) {
+    for (int slice = 0; slice <= kSlices; ++slice) {
         const QRect body(area.left(), area.top(), fadeStart - area.left(), area.height());
-        const QRect piece(fadeStart + (slice - 1) * sliceWidth, area.top(), sliceWidth, area.height());
+        const QRect piece(fadeStart + (slice - 1) * kSliceWidth, area.top(), kSliceWidth, area.height());
         painter.setClipRect(slice == 0 ? body : piece);
-        color.setAlpha(alpha * (slices - slice) / slices);
+        color.setAlpha(alpha * (kSlices - slice) / kSlices);
         painter.setPen(color);
         drawLine(painter);
     }

@@ -1,10 +1,11 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QLabel>
 
 /**
- * A label that shows its text literally, never as mark-up. A text too wide for the label fades out at its end, so
- * that a part is not taken for the whole; where no tool tip is set, pointing at the label then shows all of it.
+ * A label that shows its text literally, never as mark-up. A text too wide for the label fades out at its end. Pointing
+ * at the label then shows all of it, unless a tool tip is set.
  */
 class ToolkitLabel : public QLabel
 {
@@ -14,11 +15,11 @@ public:
     explicit ToolkitLabel(QWidget* parent = nullptr);
     explicit ToolkitLabel(const QString& text, QWidget* parent = nullptr);
 
-    /// The string to hand to a tool tip so that it reads exactly as @p text, even if @p text looks like mark-up.
+    /// The string that makes a tool tip read exactly as @p text, even if @p text looks like mark-up.
     static QString plainToolTip(const QString& text);
 
-    /// Makes the font smaller, in whole pixels and to no less than 8, until the text fits the label's width; a hidden
-    /// label waits for that until it is shown.
+    /// Makes the font smaller until the text fits the label's width, in whole pixels and not below 8. A hidden label
+    /// does so when it is shown.
     void shrinkFontToWidth();
 
     /// The y coordinate of a single line's baseline. Where the label is lower than the font's line, the line is

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitlineedit.h"
 
 #include "toolkitlabel.h"
@@ -11,12 +12,12 @@
 namespace
 {
 
-constexpr qreal frameRadius = 6;
-constexpr int sideMargin = 8;
-constexpr int bubblePadding = 8;
-constexpr int bubbleGap = 4;
-constexpr int messageLength = 200;
-const QColor bubbleColor(0xb3, 0x26, 0x1e);
+constexpr qreal kFrameRadius = 6;
+constexpr int kSideMargin = 8;
+constexpr int kBubblePadding = 8;
+constexpr int kBubbleGap = 4;
+constexpr int kMessageLength = 200;
+const QColor kBubbleColor(0xb3, 0x26, 0x1e);
 
 /// The alert's bubble: white on red in both themes.
 class AlertBubble : public ToolkitLabel
@@ -28,7 +29,7 @@ public:
         setAttribute(Qt::WA_TransparentForMouseEvents);
         setFocusPolicy(Qt::NoFocus);
         setWordWrap(true);
-        setContentsMargins(bubblePadding, bubblePadding / 2, bubblePadding, bubblePadding / 2);
+        setContentsMargins(kBubblePadding, kBubblePadding / 2, kBubblePadding, kBubblePadding / 2);
         QPalette colors;
         colors.setColor(QPalette::WindowText, Qt::white);
         setPalette(colors);
@@ -41,8 +42,8 @@ protected:
             QPainter painter(this);
             painter.setRenderHint(QPainter::Antialiasing);
             painter.setPen(Qt::NoPen);
-            painter.setBrush(bubbleColor);
-            painter.drawRoundedRect(rect(), frameRadius, frameRadius);
+            painter.setBrush(kBubbleColor);
+            painter.drawRoundedRect(rect(), kFrameRadius, kFrameRadius);
         }
         ToolkitLabel::paintEvent(event);
     }
@@ -54,7 +55,7 @@ ToolkitLineEdit::ToolkitLineEdit(QWidget* parent) : QLineEdit(parent), m_bubbleT
 {
     setFrame(false);
     setAttribute(Qt::WA_Hover);
-    setTextMargins(sideMargin, 0, sideMargin, 0);
+    setTextMargins(kSideMargin, 0, kSideMargin, 0);
     // The field is painted here; only its text is left to the style.
     QPalette colors;
     colors.setColor(QPalette::Base, Qt::transparent);
@@ -92,7 +93,7 @@ void ToolkitLineEdit::showAlertMessage(const QString& message, int ms)
         return;
     m_alertMessage = message;
     m_bubble = new AlertBubble(window());
-    m_bubble->setText(message.size() > messageLength ? message.left(messageLength) + QChar(0x2026) : message);
+    m_bubble->setText(message.size() > kMessageLength ? message.left(kMessageLength) + QChar(0x2026) : message);
     window()->installEventFilter(this);
     placeBubble();
     m_bubble->show();
@@ -119,10 +120,10 @@ void ToolkitLineEdit::placeBubble()
 {
     const QWidget* frame = m_bubble->parentWidget();
     const QPoint corner = mapTo(frame, QPoint(0, 0));
-    const int room = qMax(60, frame->width() - corner.x() - bubbleGap);
-    const int wanted = m_bubble->fontMetrics().size(0, m_bubble->text()).width() + 2 * bubblePadding + 2;
-    const int textEnd = textMargins().left() + fontMetrics().horizontalAdvance(displayText()) + bubblePadding;
-    const int signs = width() - qMax(textMargins().right(), bubbleGap);
+    const int room = qMax(60, frame->width() - corner.x() - kBubbleGap);
+    const int wanted = m_bubble->fontMetrics().size(0, m_bubble->text()).width() + 2 * kBubblePadding + 2;
+    const int textEnd = textMargins().left() + fontMetrics().horizontalAdvance(displayText()) + kBubblePadding;
+    const int signs = width() - qMax(textMargins().right(), kBubbleGap);
     if (wanted <= signs - textEnd && m_bubble->heightForWidth(wanted) <= height()) {
         // Here it hides nothing, neither the next field nor a button.
         m_bubble->resize(wanted, m_bubble->heightForWidth(wanted));
@@ -131,9 +132,9 @@ void ToolkitLineEdit::placeBubble()
     }
     const int width = qMin(wanted, qMin(room, qMax(this->width(), 60)));
     m_bubble->resize(width, m_bubble->heightForWidth(width));
-    int top = corner.y() + height() + bubbleGap;
+    int top = corner.y() + height() + kBubbleGap;
     if (top + m_bubble->height() > frame->height())
-        top = qMax(0, corner.y() - bubbleGap - m_bubble->height());
+        top = qMax(0, corner.y() - kBubbleGap - m_bubble->height());
     m_bubble->move(corner.x(), top);
 }
 
@@ -182,17 +183,17 @@ void ToolkitLineEdit::paintEvent(QPaintEvent* event)
         if (hasFocus())
             edge = palette().color(QPalette::Link);
         if (m_alert)
-            edge = base.lightness() < 128 ? QColor(0xff, 0x8a, 0x80) : bubbleColor;
+            edge = base.lightness() < 128 ? QColor(0xff, 0x8a, 0x80) : kBubbleColor;
         const qreal width = hasFocus() ? 2 : m_alert ? 1.5 : 1;
         painter.setPen(QPen(edge, width));
         painter.setBrush(base);
         const QRectF field = QRectF(rect()).adjusted(width / 2, width / 2, -width / 2, -width / 2);
-        painter.drawRoundedRect(field, frameRadius, frameRadius);
+        painter.drawRoundedRect(field, kFrameRadius, kFrameRadius);
         if (m_alert) {
             edge.setAlpha(24);
             painter.setPen(Qt::NoPen);
             painter.setBrush(edge);
-            painter.drawRoundedRect(field, frameRadius, frameRadius);
+            painter.drawRoundedRect(field, kFrameRadius, kFrameRadius);
         }
     }
     QLineEdit::paintEvent(event);

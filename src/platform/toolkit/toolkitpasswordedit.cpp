@@ -1,8 +1,12 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitpasswordedit.h"
 
 #include "toolkittoolbutton.h"
 
 #include <QAbstractButton>
+#include <QAccessible>
+#include <QClipboard>
+#include <QGuiApplication>
 #include <QKeyEvent>
 #include <QPainter>
 #include <QPainterPath>
@@ -15,9 +19,9 @@
 namespace
 {
 
-constexpr int signSize = 28;
-constexpr int signInset = 4;
-constexpr int revealKey = Qt::CTRL | Qt::Key_R;
+constexpr int kSignSize = 28;
+constexpr int kSignInset = 4;
+constexpr int kRevealKey = Qt::CTRL + Qt::Key_R;
 
 /// Whether Caps Lock is on, as far as an X server can tell.
 bool capsLockOn()
@@ -43,7 +47,7 @@ public:
         setFocusPolicy(Qt::NoFocus);
         setCursor(Qt::ArrowCursor);
         setAttribute(Qt::WA_Hover);
-        resize(signSize, signSize);
+        resize(kSignSize, kSignSize);
     }
 
 protected:
@@ -52,10 +56,6 @@ protected:
         QPainter painter(this);
         painter.setRenderHint(QPainter::Antialiasing);
         QColor ink = palette().color(QPalette::Text);
-        if (hasFocus() && window()->testAttribute(Qt::WA_KeyboardFocusChange)) {
-            painter.setPen(QPen(palette().color(QPalette::Link), 2));
-            painter.drawRoundedRect(QRectF(rect()).adjusted(2, 2, -2, -2), 5, 5);
-        }
         ink.setAlpha(underMouse() || isDown() ? 230 : 160);
         painter.setPen(QPen(ink, 1.4, Qt::SolidLine, Qt::RoundCap));
         painter.translate(QRectF(rect()).center());
@@ -79,7 +79,7 @@ public:
         setCursor(Qt::ArrowCursor);
         setAccessibleName(QStringLiteral("大写锁定已打开"));
         setToolTip(QStringLiteral("大写锁定已打开"));
-        resize(signSize, signSize);
+        resize(kSignSize, kSignSize);
         hide();
     }
 
@@ -96,6 +96,50 @@ protected:
     }
 };
 
+/// Whether nobody but the user may know what is in the field.
+bool isSecret(const ToolkitPasswordEdit& edit)
+{
+    return edit.echoMode() != QLineEdit::Normal || !edit.window()->isVisible();
+}
+
+void passOn(QAccessibleEvent* event);
+
+/// A line edit tells assistive programs what is typed into it, letter by letter, hidden or not: here as stars.
+void hideTypedText(QAccessibleEvent* event)
+{
+    const auto* edit = qobject_cast<ToolkitPasswordEdit*>(event->object());
+    if (!edit || !isSecret(*edit))
+        return passOn(event);
+    const auto stars = [](const QString& text) { return QString(text.size(), QLatin1Char('*')); };
+    if (event->type() == QAccessible::TextInserted) {
+        const auto* inserted = static_cast<QAccessibleTextInsertEvent*>(event);
+        QAccessibleTextInsertEvent hidden(event->object(), inserted->changePosition(), stars(inserted->textInserted()));
+        hidden.setCursorPosition(inserted->cursorPosition());
+        passOn(&hidden);
+    } else if (event->type() == QAccessible::TextRemoved) {
+        const auto* removed = static_cast<QAccessibleTextRemoveEvent*>(event);
+        QAccessibleTextRemoveEvent hidden(event->object(), removed->changePosition(), stars(removed->textRemoved()));
+        hidden.setCursorPosition(removed->cursorPosition());
+        passOn(&hidden);
+    } else if (event->type() == QAccessible::TextUpdated) {
+        const auto* updated = static_cast<QAccessibleTextUpdateEvent*>(event);
+        QAccessibleTextUpdateEvent hidden(event->object(), updated->changePosition(), stars(updated->textRemoved()),
+                                          stars(updated->textInserted()));
+        hidden.setCursorPosition(updated->cursorPosition());
+        passOn(&hidden);
+    } else {
+        passOn(event);
+    }
+}
+
+void passOn(QAccessibleEvent* event)
+{
+    // The platform's own way is the one without a handler.
+    QAccessible::installUpdateHandler(nullptr);
+    QAccessible::updateAccessibility(event);
+    QAccessible::installUpdateHandler(hideTypedText);
+}
+
 } // namespace
 
 ToolkitPasswordEdit::ToolkitPasswordEdit(QWidget* parent)
@@ -108,14 +152,24 @@ ToolkitPasswordEdit::ToolkitPasswordEdit(QWidget* parent)
     m_clearButton->setCursor(Qt::ArrowCursor);
     // The icon is drawn for light fields, and has to be seen on dark ones.
     m_clearButton->setIconTinted(true);
-    m_clearButton->resize(signSize, signSize);
+    m_clearButton->resize(kSignSize, kSignSize);
     m_clearButton->hide();
-    connect(m_clearButton, &QAbstractButton::clicked, this, &QLineEdit::clear);
+    connect(m_clearButton, &QAbstractButton::clicked, this, &ToolkitPasswordEdit::clear);
     connect(this, &QLineEdit::textChanged, this, &ToolkitPasswordEdit::updateClearButton);
     setDragEnabled(false);
+    QAccessible::installUpdateHandler(hideTypedText);
     connect(m_echoButton, &QAbstractButton::toggled, this, &ToolkitPasswordEdit::setRevealed);
     setRevealed(false);
     arrange();
+}
+
+void ToolkitPasswordEdit::clear()
+{
+    // Unlike QLineEdit::clear(), which undo takes back.
+    setText(QString());
+    QClipboard* clipboard = QGuiApplication::clipboard();
+    if (clipboard->ownsSelection())
+        clipboard->clear(QClipboard::Selection);
 }
 
 void ToolkitPasswordEdit::setEchoButtonVisible(bool visible)
@@ -136,7 +190,7 @@ void ToolkitPasswordEdit::setRevealed(bool revealed)
                         Qt::ImhNoAutoUppercase);
     const QString name = revealed ? QStringLiteral("隐藏密码") : QStringLiteral("显示密码");
     m_echoButton->setAccessibleName(name);
-    const QString key = QKeySequence(revealKey).toString(QKeySequence::NativeText);
+    const QString key = QKeySequence(kRevealKey).toString(QKeySequence::NativeText);
     m_echoButton->setAccessibleDescription(key);
     m_echoButton->setToolTip(name + QStringLiteral(" (%1)").arg(key));
 }
@@ -167,7 +221,7 @@ void ToolkitPasswordEdit::updateCapsLock()
 
 void ToolkitPasswordEdit::arrange()
 {
-    int right = width() - signInset;
+    int right = width() - kSignInset;
     for (QWidget* sign : {static_cast<QWidget*>(m_echoButton), static_cast<QWidget*>(m_clearButton), m_capsSign}) {
         if (!sign->isVisibleTo(this))
             continue;
@@ -205,7 +259,7 @@ void ToolkitPasswordEdit::keyPressEvent(QKeyEvent* event)
         event->accept();
         return;
     }
-    if (m_echoButtonVisible && QKeySequence(int(event->modifiers()) | event->key()) == QKeySequence(revealKey))
+    if (m_echoButtonVisible && QKeySequence(int(event->modifiers()) | event->key()) == QKeySequence(kRevealKey))
         return m_echoButton->toggle();
     ToolkitLineEdit::keyPressEvent(event);
 }

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include "toolkitlineedit.h"
@@ -8,9 +9,9 @@ class QAbstractButton;
 class ToolkitToolButton;
 
 /**
- * A line edit for a password. A button inside it, or Ctrl+R, reveals the text until used again or the field disappears;
- * text that is hidden cannot be copied, cut or dragged out. Under X11 a sign shows that Caps Lock is on while the
- * field has the focus.
+ * A line edit for a password. A button inside it, or Ctrl+R, reveals the text until used again or the field disappears.
+ * Hidden text cannot be copied, cut or dragged out, and assistive programs see stars. Under X11 a sign shows that Caps
+ * Lock is on while the field has the focus.
  */
 class ToolkitPasswordEdit : public ToolkitLineEdit
 {
@@ -18,6 +19,9 @@ class ToolkitPasswordEdit : public ToolkitLineEdit
 
 public:
     explicit ToolkitPasswordEdit(QWidget* parent = nullptr);
+
+    /// Empties the field, and forgets what undo would bring back and what of it is the desktop's selection.
+    void clear();
 
     /// Whether the field offers its reveal button, as it does at first. Without it the text is hidden.
     void setEchoButtonVisible(bool visible);

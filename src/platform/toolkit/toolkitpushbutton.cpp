@@ -1,14 +1,17 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitpushbutton.h"
+
+#include "focusring.h"
 
 #include <QPainter>
 
 namespace
 {
 
-constexpr qreal cornerRadius = 8;
-constexpr int textMargin = 16;
-constexpr int smallestWidth = 80;
-constexpr int usualHeight = 36;
+constexpr qreal kCornerRadius = 8;
+constexpr int kTextMargin = 16;
+constexpr int kSmallestWidth = 80;
+constexpr int kUsualHeight = 36;
 
 QColor withAlpha(QColor color, int alpha)
 {
@@ -35,7 +38,7 @@ ToolkitPushButton::ToolkitPushButton(const QColor& accent, const QString& text, 
 QSize ToolkitPushButton::sizeHint() const
 {
     const QSize text = fontMetrics().size(Qt::TextHideMnemonic, this->text());
-    return {qMax(smallestWidth, text.width() + 2 * textMargin), qMax(usualHeight, text.height() + 12)};
+    return {qMax(kSmallestWidth, text.width() + 2 * kTextMargin), qMax(kUsualHeight, text.height() + 12)};
 }
 
 QSize ToolkitPushButton::minimumSizeHint() const
@@ -45,7 +48,7 @@ QSize ToolkitPushButton::minimumSizeHint() const
 
 QColor ToolkitPushButton::fillColor() const
 {
-    // Darker states of an accent keep its white text legible.
+    // Hovered and pressed accents are darker, so that the white text stays legible.
     if (isEnabled() && m_accent.isValid())
         return isDown() ? m_accent.darker(130) : underMouse() ? m_accent.darker(112) : m_accent;
     return palette().color(QPalette::Button);
@@ -67,19 +70,17 @@ void ToolkitPushButton::paintEvent(QPaintEvent*)
     const QColor ink = palette().color(QPalette::WindowText);
     painter.setPen(accented ? QPen(Qt::NoPen) : QPen(withAlpha(ink, isEnabled() && underMouse() ? 70 : 44), 1));
     painter.setBrush(fillColor());
-    painter.drawRoundedRect(plate, cornerRadius, cornerRadius);
+    painter.drawRoundedRect(plate, kCornerRadius, kCornerRadius);
     if (!accented && isEnabled() && (isDown() || underMouse())) {
         painter.setPen(Qt::NoPen);
         painter.setBrush(withAlpha(ink, isDown() ? 36 : 14));
-        painter.drawRoundedRect(plate, cornerRadius, cornerRadius);
+        painter.drawRoundedRect(plate, kCornerRadius, kCornerRadius);
     }
-    if (hasFocus() && window()->testAttribute(Qt::WA_KeyboardFocusChange)) {
-        const qreal inset = accented ? 3 : 1;
-        painter.setPen(QPen(accented ? QColor(Qt::white) : palette().color(QPalette::Link), accented ? 1.5 : 2));
-        painter.setBrush(Qt::NoBrush);
-        painter.drawRoundedRect(QRectF(rect()).adjusted(inset, inset, -inset, -inset), cornerRadius - inset,
-                                cornerRadius - inset);
-    }
+    // On an accent the ring is white and lies inside the edge, where it stands out.
+    if (accented)
+        focusring::paint(painter, this, rect().adjusted(2, 2, -2, -2), kCornerRadius - 2, Qt::white);
+    else
+        focusring::paint(painter, this, rect(), kCornerRadius);
     painter.setPen(textColor());
     const int room = qMax(0, width() - 8);
     const QString shown = fontMetrics().elidedText(text(), Qt::ElideRight, room, Qt::TextHideMnemonic);

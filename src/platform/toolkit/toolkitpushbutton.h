@@ -1,11 +1,11 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QPushButton>
 
 /**
- * A push button in the toolkit's own look, whatever the desktop's style: rounded, with visible hover, pressed,
- * disabled and keyboard-focus states. This one is quiet; its text has the palette's button-text colour, or the one
- * that a style sheet sets.
+ * A rounded push button that looks the same in every desktop style. Hover, press, focus and disabling are visible. This
+ * one is quiet; its text has the palette's button-text colour, or that of a style sheet.
  */
 class ToolkitPushButton : public QPushButton
 {

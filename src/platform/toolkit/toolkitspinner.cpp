@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitspinner.h"
 
 #include <QPainter>
@@ -6,17 +7,17 @@
 namespace
 {
 
-constexpr int spokes = 12;
-constexpr int stepMs = 80;
+constexpr int kSpokes = 12;
+constexpr int kStepMs = 80;
 
 } // namespace
 
 ToolkitSpinner::ToolkitSpinner(QWidget* parent) : QWidget(parent), m_timer(new QTimer(this))
 {
     setAccessibleName(QStringLiteral("正在处理"));
-    m_timer->setInterval(stepMs);
+    m_timer->setInterval(kStepMs);
     connect(m_timer, &QTimer::timeout, this, [this] {
-        m_step = (m_step + 1) % spokes;
+        m_step = (m_step + 1) % kSpokes;
         update();
     });
 }
@@ -68,11 +69,11 @@ void ToolkitSpinner::paintEvent(QPaintEvent*)
     painter.translate(QRectF(rect()).center());
     const qreal reach = qMin(width(), height()) / 2.0;
     QColor color = palette().color(QPalette::Link);
-    for (int spoke = 0; spoke < spokes; ++spoke) {
-        const int age = (m_step - spoke + spokes) % spokes;
+    for (int spoke = 0; spoke < kSpokes; ++spoke) {
+        const int age = (m_step - spoke + kSpokes) % kSpokes;
         color.setAlpha(qMax(38, 255 - age * 22));
         painter.setPen(QPen(color, reach / 6, Qt::SolidLine, Qt::RoundCap));
         painter.drawLine(QPointF(0, -reach * 0.5), QPointF(0, -reach * 0.88));
-        painter.rotate(360.0 / spokes);
+        painter.rotate(360.0 / kSpokes);
     }
 }

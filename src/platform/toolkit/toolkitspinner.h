@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QWidget>
@@ -5,8 +6,8 @@
 class QTimer;
 
 /**
- * A turning ring of spokes for work of unknown length. It wakes the program only while it is both playing and shown,
- * and while stopped it paints nothing.
+ * A turning ring of spokes for work of unknown length. It wakes the program only while it is playing and shown. While
+ * stopped it paints nothing.
  */
 class ToolkitSpinner : public QWidget
 {

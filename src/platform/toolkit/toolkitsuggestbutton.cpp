@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitsuggestbutton.h"
 
 ToolkitSuggestButton::ToolkitSuggestButton(QWidget* parent) : ToolkitSuggestButton(QString(), parent)

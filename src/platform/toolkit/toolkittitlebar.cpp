@@ -1,5 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkittitlebar.h"
 
+#include "focusring.h"
 #include "toolkitlabel.h"
 
 #include <QApplication>
@@ -13,8 +15,8 @@
 namespace
 {
 
-constexpr int buttonSize = 28;
-constexpr int iconExtent = 20;
+constexpr int kButtonSize = 28;
+constexpr int kIconExtent = 20;
 
 /// A button whose sign is drawn from lines, so that it is sharp at every scale and follows the palette.
 class SignButton : public QToolButton
@@ -24,12 +26,12 @@ public:
 
     SignButton(Sign sign, const QString& name, QWidget* parent) : QToolButton(parent), m_sign(sign)
     {
-        setFixedSize(buttonSize, buttonSize);
+        setFixedSize(kButtonSize, kButtonSize);
         setAccessibleName(name);
         setToolTip(name);
         setAttribute(Qt::WA_Hover);
         setFocusPolicy(Qt::TabFocus);
-        // Assistive programs are offered no press of a button that opens a menu, even if it has none.
+        // In this mode assistive programs are offered no press of the button, even while it has no menu.
         if (sign == Sign::Menu)
             setPopupMode(QToolButton::InstantPopup);
     }
@@ -46,21 +48,17 @@ protected:
             painter.setBrush(ink);
             painter.drawRoundedRect(rect(), 6, 6);
         }
-        if (hasFocus() && window()->testAttribute(Qt::WA_KeyboardFocusChange)) {
-            painter.setPen(QPen(palette().color(QPalette::Highlight), 2));
-            painter.setBrush(Qt::NoBrush);
-            painter.drawRoundedRect(QRectF(rect()).adjusted(1, 1, -1, -1), 6, 6);
-        }
+        focusring::paint(painter, this, rect(), 6);
         ink.setAlpha(isDown() || underMouse() ? 230 : 170);
         painter.setPen(QPen(ink, 1.4, Qt::SolidLine, Qt::RoundCap));
         painter.translate(QRectF(rect()).center());
-        constexpr qreal reach = 4.5;
+        constexpr qreal kReach = 4.5;
         if (m_sign == Sign::Close) {
-            painter.drawLine(QPointF(-reach, -reach), QPointF(reach, reach));
-            painter.drawLine(QPointF(-reach, reach), QPointF(reach, -reach));
+            painter.drawLine(QPointF(-kReach, -kReach), QPointF(kReach, kReach));
+            painter.drawLine(QPointF(-kReach, kReach), QPointF(kReach, -kReach));
         } else {
             for (const qreal y : {-4.5, -0.5, 3.5})
-                painter.drawLine(QPointF(-reach, y), QPointF(reach, y));
+                painter.drawLine(QPointF(-kReach, y), QPointF(kReach, y));
         }
     }
 
@@ -92,7 +90,7 @@ ToolkitTitlebar::ToolkitTitlebar(QWidget* parent)
 
 void ToolkitTitlebar::setIcon(const QIcon& icon)
 {
-    m_icon->setPixmap(icon.pixmap(window()->windowHandle(), QSize(iconExtent, iconExtent)));
+    m_icon->setPixmap(icon.pixmap(window()->windowHandle(), QSize(kIconExtent, kIconExtent)));
     m_icon->setVisible(!icon.isNull());
 }
 

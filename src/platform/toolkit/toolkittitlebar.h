@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QIcon>
@@ -9,8 +10,8 @@ class QToolButton;
 class ToolkitLabel;
 
 /**
- * The title bar of a frameless window: an optional icon and title, an optional menu, and a close button that closes
- * the window. Dragging it with the left button moves the window.
+ * The title bar of a frameless window: optional icon, title and menu, and a button that closes the window. Dragging it
+ * with the left button moves the window.
  */
 class ToolkitTitlebar : public QWidget
 {

@@ -1,4 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkittoolbutton.h"
+
+#include "focusring.h"
 
 #include <QPainter>
 #include <QWindow>
@@ -7,7 +10,7 @@ namespace
 {
 
 /// Room between the text and the focus ring or the button's edge.
-constexpr int textMargin = 5;
+constexpr int kTextMargin = 5;
 
 } // namespace
 
@@ -41,7 +44,7 @@ void ToolkitToolButton::paintEvent(QPaintEvent*)
         color = color.darker(130);
 
     const int textFlags = static_cast<int>(m_alignment | Qt::AlignVCenter) | Qt::TextShowMnemonic;
-    const QRect textArea = rect().adjusted(textMargin, 0, -textMargin, 0);
+    const QRect textArea = rect().adjusted(kTextMargin, 0, -kTextMargin, 0);
     QRectF ring = rect();
     if (!icon().isNull()) {
         if (hovered || isDown()) {
@@ -73,12 +76,7 @@ void ToolkitToolButton::paintEvent(QPaintEvent*)
         painter.setPen(color);
         painter.drawText(textArea, textFlags, text());
         const QRect textRect = fontMetrics().boundingRect(textArea, textFlags, text());
-        ring = textRect.adjusted(1 - textMargin, 0, textMargin - 1, 0) & rect();
+        ring = textRect.adjusted(1 - kTextMargin, 0, kTextMargin - 1, 0) & rect();
     }
-
-    if (hasFocus() && window()->testAttribute(Qt::WA_KeyboardFocusChange)) {
-        painter.setPen(QPen(palette().color(QPalette::Highlight), 1));
-        painter.setBrush(Qt::NoBrush);
-        painter.drawRoundedRect(ring.adjusted(0.5, 0.5, -0.5, -0.5), 4, 4);
-    }
+    focusring::paint(painter, this, ring, 5);
 }

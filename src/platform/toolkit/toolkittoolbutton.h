@@ -1,10 +1,11 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QToolButton>
 
 /**
- * A flat tool button without a frame: text in the palette's button-text colour, underlined under the pointer like a
- * link, with a visible ring when it has the keyboard focus. An icon, if set, is drawn centred on a quiet highlight.
+ * A flat tool button without a frame. Its text has the palette's button-text colour and is underlined under the
+ * pointer, like a link. An icon, if set, is drawn centred on a quiet highlight.
  */
 class ToolkitToolButton : public QToolButton
 {
@@ -16,7 +17,7 @@ public:
     /// Where the text lies in the button: Qt::AlignLeft, Qt::AlignHCenter (at first) or Qt::AlignRight.
     void setTextAlignment(Qt::Alignment alignment);
 
-    /// Whether the icon is only a shape, drawn in the palette's text colour whatever its own (not so at first).
+    /// Whether the icon is drawn in the palette's text colour instead of its own. It is not at first.
     void setIconTinted(bool tinted);
 
 protected:

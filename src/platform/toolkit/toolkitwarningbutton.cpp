@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "toolkitwarningbutton.h"
 
 ToolkitWarningButton::ToolkitWarningButton(QWidget* parent) : ToolkitWarningButton(QString(), parent)

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "windowmanagerhelper.h"
 
 #include <KWindowEffects>
@@ -12,7 +13,7 @@ WindowManagerHelper* WindowManagerHelper::instance()
 
 bool WindowManagerHelper::hasBlurWindow() const
 {
-    // The cheap question first: the effects library loads a plugin and talks to the X server.
+    // The cheap question comes first: the effects library loads a plugin and asks the X server.
     return hasComposite() && KWindowEffects::isEffectAvailable(KWindowEffects::BlurBehind);
 }
 
@@ -21,4 +22,13 @@ bool WindowManagerHelper::hasComposite() const
     if (QX11Info::isPlatformX11())
         return QX11Info::isCompositingManagerRunning();
     return QGuiApplication::platformName().startsWith(QLatin1String("wayland"));
+}
+
+void WindowManagerHelper::takePresentTime()
+{
+    if (!QX11Info::isPlatformX11())
+        return;
+    const auto now = static_cast<unsigned long>(QX11Info::getTimestamp());
+    QX11Info::setAppTime(now);
+    QX11Info::setAppUserTime(now);
 }

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "activeconnections.h"
 
 #include "jsonreader.h"
@@ -13,14 +14,20 @@ namespace zent
 namespace
 {
 
+const char* const kHwAddress = "HwAddress";
+
+bool isPrimary(const QJsonValue& value)
+{
+    return value.toObject().value(QLatin1String("IsPrimaryConnection")) == QJsonValue(true);
+}
+
 /// Nothing when a value has another type than it should.
 std::optional<ActiveConnection> connectionFromJson(const QJsonValue& value)
 {
     base::JsonReader object(value);
     base::JsonReader ip4(object.object("Ip4"));
     ActiveConnection connection;
-    connection.primary = object.flag("IsPrimaryConnection");
-    connection.hwAddress = object.text("HwAddress");
+    connection.hwAddress = object.text(kHwAddress);
     connection.speed = object.text("Speed");
     connection.address = ip4.text("Address");
     connection.mask = ip4.text("Mask");
@@ -36,19 +43,29 @@ std::optional<ActiveConnection> connectionFromJson(const QJsonValue& value)
 std::optional<QJsonArray> parseConnectionArray(const QByteArray& json)
 {
     const QJsonDocument document = QJsonDocument::fromJson(json);
-    const QJsonArray array = document.array();
-    if (!document.isArray() || !std::all_of(array.begin(), array.end(), connectionFromJson))
-        return std::nullopt;
-    return array;
+    return document.isArray() ? std::optional<QJsonArray>(document.array()) : std::nullopt;
 }
 
-std::vector<ActiveConnection> activeConnections(const QJsonArray& array)
+std::optional<std::vector<ActiveConnection>> primaryConnections(const QJsonArray& array)
 {
     std::vector<ActiveConnection> connections;
-    connections.reserve(static_cast<std::size_t>(array.size()));
-    for (const QJsonValue& value : array)
-        connections.push_back(connectionFromJson(value).value_or(ActiveConnection()));
+    for (const QJsonValue& value : array) {
+        if (!isPrimary(value))
+            continue;
+        const auto connection = connectionFromJson(value);
+        if (!connection)
+            return std::nullopt;
+        connections.push_back(*connection);
+    }
     return connections;
+}
+
+std::optional<QString> primaryHwAddress(const QJsonArray& array)
+{
+    const auto primary = std::find_if(array.begin(), array.end(), isPrimary);
+    if (primary == array.end())
+        return std::nullopt;
+    return (*primary).toObject().value(QLatin1String(kHwAddress)).toString();
 }
 
 } // namespace zent

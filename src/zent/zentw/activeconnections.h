@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QByteArray>
@@ -12,7 +13,6 @@ namespace zent
 
 /// One active connection as the network daemon describes it; what the daemon left out is empty.
 struct ActiveConnection {
-    bool primary = false;
     QString hwAddress;
     QString speed;
     QString address;
@@ -22,11 +22,14 @@ struct ActiveConnection {
     QString dns;
 };
 
-/// The daemon's answer; nothing when `json` is not a JSON array, or when what is read of a connection has another type
-/// than it should.
+/// The daemon's answer; nothing when `json` is not a JSON array.
 std::optional<QJsonArray> parseConnectionArray(const QByteArray& json);
 
-/// The connections of the answer, in its order.
-std::vector<ActiveConnection> activeConnections(const QJsonArray& array);
+/// The primary connections of the answer, in its order; nothing when a value of one has another type than it should.
+/// Of other connections and elements nothing is read.
+std::optional<std::vector<ActiveConnection>> primaryConnections(const QJsonArray& array);
+
+/// The hardware address of the first primary connection, whatever its other values are; nothing without one.
+std::optional<QString> primaryHwAddress(const QJsonArray& array);
 
 } // namespace zent

@@ -1,11 +1,12 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "fileconfig.h"
 
 #include "activeconnections.h"
 #include "dbusnames.h"
-#include "filecontent.h"
 #include "filewrite.h"
 #include "networkdaemonproxy.h"
 #include "paths.h"
+#include "terminalinfo.h"
 
 #include <QDebug>
 #include <QDir>
@@ -33,15 +34,16 @@ QUrl httpsUrl(const QString& host, const QString& port, const QString& path)
     return url;
 }
 
-/// Makes the staging directory where it is missing. False when its place is taken by a symbolic link or by another
-/// user's directory: the temporary directory is open to everybody, and what is staged there is believed later.
+/// Makes the staging directory where it is missing. False for a symbolic link, and for a directory of another user or
+/// one that others may write to: everybody may write to the temporary directory.
 bool prepareStagingDirectory(const QString& path)
 {
     const QByteArray encoded = QFile::encodeName(path);
     if (mkdir(encoded.constData(), 0755) == 0)
         return true;
     struct stat status = {};
-    return lstat(encoded.constData(), &status) == 0 && S_ISDIR(status.st_mode) && status.st_uid == getuid();
+    return lstat(encoded.constData(), &status) == 0 && S_ISDIR(status.st_mode) && status.st_uid == getuid() &&
+           (status.st_mode & (S_IWGRP | S_IWOTH)) == 0;
 }
 
 } // namespace
@@ -69,19 +71,14 @@ QUrl FileConfig::getDomainUrl(const QString& path) const
 
 void FileConfig::readServerConfig(const QString& path)
 {
-    QFile file(path);
-    if (!file.exists()) {
-        qWarning() << " not found userinfo.json";
-        m_terminalName = readHostName();
-        return;
-    }
-    if (!file.open(QIODevice::ReadOnly | QIODevice::Text)) {
-        qWarning() << "fail to open file userinfo.json !";
+    const zent::base::FileReading file = zent::base::readTerminalInfo(path);
+    if (!file.opened) {
+        qWarning() << (file.exists ? "fail to open file userinfo.json !" : " not found userinfo.json");
         m_terminalName = readHostName();
         return;
     }
     QJsonParseError error;
-    const QJsonDocument document = QJsonDocument::fromJson(file.readAll(), &error);
+    const QJsonDocument document = QJsonDocument::fromJson(file.content, &error);
     if (error.error != QJsonParseError::NoError) {
         qWarning() << "userinfo.json Json error";
         return;
@@ -103,7 +100,7 @@ void FileConfig::writeServerConfig()
         {infokey::kTerminalName, m_terminalName}, {infokey::kIsDomain, m_isDomain},
     };
     const QByteArray json = QJsonDocument(object).toJson();
-    qDebug() << "FileConfig::writeServerInfo---strConfig:" << json;
+    qDebug() << "FileConfig::writeServerInfo---strConfig:" << QString::fromUtf8(json);
 
     if (prepareStagingDirectory(QFileInfo(zent::kTmpUserinfoPath).path()) &&
         zent::base::replaceFile(zent::kTmpUserinfoPath, json) == zent::base::WriteResult::Done)
@@ -134,14 +131,11 @@ QString FileConfig::getMacAddress() const
         qCritical() << "GetActiveConnectionInfo error";
         return QString();
     }
-    const QJsonArray array = zent::parseConnectionArray(answer->toUtf8()).value_or(QJsonArray());
-    for (const zent::ActiveConnection& connection : zent::activeConnections(array)) {
-        if (connection.primary) {
-            qInfo() << connection.hwAddress;
-            return connection.hwAddress;
-        }
-    }
-    return QString();
+    const auto array = zent::parseConnectionArray(answer->toUtf8());
+    const auto address = zent::primaryHwAddress(array.value_or(QJsonArray()));
+    if (address)
+        qInfo() << *address;
+    return address.value_or(QString());
 }
 
 void FileConfig::saveCert(const QString& base64Content, const QString& filePath)

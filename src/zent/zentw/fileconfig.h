@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QObject>
@@ -14,18 +15,8 @@ public:
     /// The one instance, made on first use.
     static FileConfig* GetInstance();
 
-    QString readServerHost() const { return m_serverHost; }
-    QString readServerPort() const { return m_serverPort; }
-    QString readDomainHost() const { return m_domainHost; }
-    QString readDomainPort() const { return m_domainPort; }
     QString readTerminalName() const { return m_terminalName; }
-    bool readIsDomain() const { return m_isDomain; }
 
-    void setServerHost(const QString& host) { m_serverHost = host; }
-    void setServerPort(const QString& port) { m_serverPort = port; }
-    void setDomainHost(const QString& host) { m_domainHost = host; }
-    void setDomainPort(const QString& port) { m_domainPort = port; }
-    void setTerminalName(const QString& name) { m_terminalName = name; }
     void setIsDomain(const bool& isDomain) { m_isDomain = isDomain; }
 
     /// The HTTPS address of `path` on the management server. A port text that is no number gives port 0.
@@ -46,9 +37,6 @@ public:
     /// The hardware address of the primary connection; empty without one or without the network daemon.
     QString getMacAddress() const;
 
-    /// Writes the decoded certificate to `filePath`, making its directory where needed. Failures are logged.
-    void saveCert(const QString& base64Content, const QString& filePath);
-
 private:
     FileConfig();
 
@@ -58,4 +46,19 @@ private:
     QString m_serverPort;
     QString m_terminalName;
     bool m_isDomain = false;
+
+    // Agreed with other components, and called by them only.
+public:
+    QString readServerHost() const { return m_serverHost; }
+    QString readServerPort() const { return m_serverPort; }
+    QString readDomainHost() const { return m_domainHost; }
+    QString readDomainPort() const { return m_domainPort; }
+    bool readIsDomain() const { return m_isDomain; }
+    void setServerHost(const QString& host) { m_serverHost = host; }
+    void setServerPort(const QString& port) { m_serverPort = port; }
+    void setDomainHost(const QString& host) { m_domainHost = host; }
+    void setDomainPort(const QString& port) { m_domainPort = port; }
+    void setTerminalName(const QString& name) { m_terminalName = name; }
+    /// Writes the decoded certificate to `filePath`, making its directory where needed. Failures are logged.
+    void saveCert(const QString& base64Content, const QString& filePath);
 };

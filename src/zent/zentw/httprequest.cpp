@@ -1,8 +1,10 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "httprequest.h"
 
 #include "fileconfig.h"
 #include "filecontent.h"
 #include "httpclientapi.h"
+#include "httprules.h"
 #include "paths.h"
 #include "pcnamerules.h"
 #include "urlquery.h"
@@ -14,7 +16,6 @@ namespace
 {
 
 constexpr int kReplyTimeoutSeconds = 2;
-constexpr int kStatusOk = 200;
 
 const QString kCaCertPath = QStringLiteral("/apiauth/v1/client/ca_cert");
 const QString kStatusPath = QStringLiteral("/uim/v3/client/status");
@@ -37,7 +38,7 @@ const QString kRuleEmpty = QStringLiteral("服务端返回终端规则数据为�
 const QString kRuleInvalid = QStringLiteral("正则表达式不合法");
 const QString kNameRefused = QStringLiteral("终端别名不符合正则安全规则!!");
 
-/// The lines of the rule check carry the name of the server check: log filters in the field know it under that one.
+/// The lines of the rule check carry the name of the server check; this is agreed and stays.
 QMessageLogger ruleLog(int line)
 {
     return QMessageLogger(__FILE__, line, "bool HttpRequest::checkTerminalByServer(const QString&, QString&)");
@@ -77,10 +78,17 @@ void HttpRequest::setSSLConfig(const QString& ca, const QString& cert, const QSt
     m_client->setSSLConfig(ca, cert, key);
 }
 
-void HttpRequest::get(const QUrl& url, const QString& body, ResultSlot done)
+void HttpRequest::get(const QUrl& url, ResultSlot done)
 {
     QString reply;
-    const int status = m_client->getRequest(reply, urlText(url), body, true);
+    const int status = m_client->getRequest(reply, urlText(url), QString(), true);
+    (this->*done)(status, reply);
+}
+
+void HttpRequest::poll(const QUrl& url, const QString& body, ResultSlot done)
+{
+    QString reply;
+    const int status = m_client->pollRequest(reply, urlText(url), body);
     (this->*done)(status, reply);
 }
 
@@ -100,7 +108,7 @@ void HttpRequest::getCaCert(const QString& host, const QString& port)
     url.setHost(host);
     url.setPort(port.toInt());
     url.setPath(kCaCertPath);
-    get(url, QString(), &HttpRequest::onCaCert);
+    get(url, &HttpRequest::onCaCert);
 }
 
 void HttpRequest::getMacheineCheck(MachineState state, const QString& username)
@@ -111,13 +119,13 @@ void HttpRequest::getMacheineCheck(MachineState state, const QString& username)
     const QString keyword = QStringLiteral("keyword");
     switch (state) {
     case MachineState::Join:
-        return get(zent::withQuery(url, {machine, {keyword, QStringLiteral("join")}, user}), QString(),
+        return get(zent::withQuery(url, {machine, {keyword, QStringLiteral("join")}, user}),
                    &HttpRequest::onMacheineCheck);
     case MachineState::Remove:
-        return get(zent::withQuery(url, {machine, {keyword, QStringLiteral("remove")}, user}), QString(),
+        return get(zent::withQuery(url, {machine, {keyword, QStringLiteral("remove")}, user}),
                    &HttpRequest::onMacheineCheck);
     }
-    get(zent::withQuery(url, {machine, user}), QString(), &HttpRequest::onMacheineCheck);
+    get(zent::withQuery(url, {machine, user}), &HttpRequest::onMacheineCheck);
 }
 
 void HttpRequest::postCheckAccountPwd(const QString& username, const QString& password)
@@ -154,16 +162,15 @@ void HttpRequest::postRemoveStatus(const QString& username, const QString& passw
 
 void HttpRequest::getCompanyName()
 {
-    // Number 1 is the organisation at the top of the platform's tree.
     const QUrl url = zent::withQuery(FileConfig::GetInstance()->getServerUrl(kDepartmentPath),
                                      {{QStringLiteral("id"), QStringLiteral("1")}});
-    get(url, QString(), &HttpRequest::onCompanyName);
+    poll(url, QString(), &HttpRequest::onCompanyName);
 }
 
 void HttpRequest::getUserInfo(const QString& username)
 {
     const QJsonObject body{{kUsernameKey, username}, {kMachineIdKey, machineId()}};
-    get(FileConfig::GetInstance()->getServerUrl(kAccountPath), jsonText(body), &HttpRequest::onUserInfo);
+    poll(FileConfig::GetInstance()->getServerUrl(kAccountPath), jsonText(body), &HttpRequest::onUserInfo);
 }
 
 bool HttpRequest::checkTerminalByServer(const QString& name, QString& message)
@@ -176,7 +183,7 @@ bool HttpRequest::checkTerminalByServer(const QString& name, QString& message)
     qDebug() << "check pc name result:" << status;
 
     const auto verdict = zent::parsePcNameVerdict(reply.toUtf8());
-    if (status != kStatusOk || !verdict) {
+    if (status != zent::http::kOk || !verdict) {
         message = kConfigFailed;
         return false;
     }
@@ -186,26 +193,23 @@ bool HttpRequest::checkTerminalByServer(const QString& name, QString& message)
 
 bool HttpRequest::checkPcName(const QString& name, QString& message)
 {
-    const QString url = zent::kPCRegular.arg(m_certHost, m_certPort);
+    const QString url = zent::KPCRegular.arg(m_certHost, m_certPort);
     ruleLog(__LINE__).debug() << "------regularUrl-----:" << url;
     QString reply;
     const int status = m_client->getRequest(reply, url, QString(), true);
     ruleLog(__LINE__).debug() << "------initSshPort-------msg:" << reply << "code:" << status;
 
     const zent::PcNameRule rule = zent::parsePcNameRule(reply.toUtf8());
-    switch (rule.state) {
-    case zent::PcNameRule::State::NotJson:
+    if (rule.state == zent::PcNameRule::State::NotJson)
         ruleLog(__LINE__).warning() << "invalid reply data, parse error: " << rule.parseError;
+    if (status != zent::http::kOk || rule.state == zent::PcNameRule::State::NotJson ||
+        rule.state == zent::PcNameRule::State::Refused) {
         message = kConfigFailed;
         return false;
-    case zent::PcNameRule::State::Refused:
-        message = kConfigFailed;
-        return false;
-    case zent::PcNameRule::State::Missing:
+    }
+    if (rule.state == zent::PcNameRule::State::Missing) {
         message = kRuleEmpty;
         return false;
-    case zent::PcNameRule::State::Given:
-        break;
     }
     if (rule.expression.isEmpty())
         return checkTerminalByServer(name, message);

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QJsonObject>
@@ -11,8 +12,8 @@ class HttpClientApi;
 enum class MachineState { Join = 0, Remove = 1 };
 
 /// Client of the management server's terminal API. Every request blocks until the server has answered or the reply
-/// time-out has passed, and emits its signal, with the HTTP status (negative when there was none) and the reply text,
-/// before it returns.
+/// time-out has passed. Before it returns it emits its signal with the HTTP status, negative when there was none, and
+/// the reply text.
 class HttpRequest : public QObject
 {
     Q_OBJECT
@@ -24,14 +25,6 @@ public:
     /// Paths of the certificate authority to trust, and of the client certificate and key to present.
     void setSSLConfig(const QString& ca, const QString& cert, const QString& key);
 
-    /// Asks the certificate service at `host` and `port` for its authority; the naming rule is asked there later.
-    void getCaCert(const QString& host, const QString& port);
-    /// Asks whether this terminal is joining or being removed, for `username`.
-    void getMacheineCheck(MachineState state, const QString& username);
-    /// Has the server check a directory account.
-    void postCheckAccountPwd(const QString& username, const QString& password);
-    /// Tells the server that this terminal joins management.
-    void postJoinControl(const QString& username);
     /// Tells the server that this terminal has left management.
     void postQuitControl(const QString& username);
     /// Has the server check the administrator password for the release of this terminal.
@@ -40,12 +33,6 @@ public:
     void getCompanyName();
     /// Asks for the directory data of `username`.
     void getUserInfo(const QString& username);
-
-    /// Whether the server accepts `name` for this terminal; otherwise `message` says why, in words for the user.
-    bool checkTerminalByServer(const QString& name, QString& message);
-    /// Whether `name` follows the server's naming rule; with an empty rule the server decides. Otherwise `message`
-    /// says why not, in words for the user.
-    bool checkPcName(const QString& name, QString& message);
 
 public slots:
     void onCaCert(const int& statusCode, const QString& data);
@@ -72,7 +59,8 @@ private:
 
     HttpRequest();
 
-    void get(const QUrl& url, const QString& body, ResultSlot done);
+    void get(const QUrl& url, ResultSlot done);
+    void poll(const QUrl& url, const QString& body, ResultSlot done);
     void post(const QUrl& url, const QJsonObject& body, ResultSlot done);
 
     static bool matchesRule(const QString& rule, const QString& name, QString& message);
@@ -80,4 +68,20 @@ private:
     HttpClientApi* m_client;
     QString m_certHost;
     QString m_certPort;
+
+    // Agreed with other components, and called by them only.
+public:
+    /// Asks the certificate service at `host` and `port` for its authority; the naming rule is asked there later.
+    void getCaCert(const QString& host, const QString& port);
+    /// Asks whether this terminal is joining or being removed, for `username`.
+    void getMacheineCheck(MachineState state, const QString& username);
+    /// Has the server check a directory account.
+    void postCheckAccountPwd(const QString& username, const QString& password);
+    /// Tells the server that this terminal joins management.
+    void postJoinControl(const QString& username);
+    /// Whether the server accepts `name` for this terminal; otherwise `message` says why, in words for the user.
+    bool checkTerminalByServer(const QString& name, QString& message);
+    /// Whether `name` follows the server's naming rule; with an empty rule the server decides. Otherwise `message`
+    /// says why not, in words for the user.
+    bool checkPcName(const QString& name, QString& message);
 };

@@ -1,19 +1,34 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "networkdaemonproxy.h"
 
 #include "dbusnames.h"
 
 #include <QDBusArgument>
+#include <QDBusError>
 #include <QDBusMessage>
 #include <QDBusPendingCall>
+#include <QDeadlineTimer>
 #include <QDebug>
 #include <QElapsedTimer>
 
 namespace
 {
 
-/// A call that fails after this long has run into a time-out, of this bus connection or of the bus itself.
+/// A daemon that leaves the bus ends a call at once, with an error of the same names as a time-out.
 constexpr int kHangMs = 1000;
 constexpr int kPauseMs = 60000;
+
+bool isTimeOut(QDBusError::ErrorType type)
+{
+    return type == QDBusError::NoReply || type == QDBusError::Timeout || type == QDBusError::TimedOut;
+}
+
+/// Every proxy waits for the same daemon.
+QDeadlineTimer& pause()
+{
+    static QDeadlineTimer pause;
+    return pause;
+}
 
 } // namespace
 
@@ -25,16 +40,16 @@ NetworkDaemonProxy::NetworkDaemonProxy(const QString& service, const QString& pa
 
 std::optional<QString> NetworkDaemonProxy::activeConnectionInfo()
 {
-    if (!m_pause.hasExpired())
+    if (!pause().hasExpired())
         return std::nullopt;
     QElapsedTimer waited;
     waited.start();
     QDBusPendingCall call = asyncCall(QStringLiteral("GetActiveConnectionInfo"));
     call.waitForFinished();
     if (call.isError()) {
-        const bool hangs = waited.hasExpired(kHangMs);
+        const bool hangs = isTimeOut(call.error().type()) && waited.hasExpired(kHangMs);
         if (hangs)
-            m_pause.setRemainingTime(kPauseMs);
+            pause().setRemainingTime(kPauseMs);
         qWarning().noquote() << "GetActiveConnectionInfo failed:" << call.error().name() << call.error().message()
                              << (hangs ? "The network daemon is not asked again for 60 s." : "");
         return std::nullopt;

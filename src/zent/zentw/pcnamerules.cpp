@@ -1,11 +1,12 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "pcnamerules.h"
 
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QRegExp>
+#include <QRegularExpression>
 
 #include <algorithm>
-#include <vector>
 
 namespace zent
 {
@@ -18,129 +19,75 @@ bool isSuccess(const QJsonObject& reply)
     return reply.value(QLatin1String("code")).toInt(-1) == 0;
 }
 
-/// Far above any rule for names of at most 255 characters; rules at the limits have taken up to a second.
-constexpr int kMaxRuleLength = 1024;
-constexpr int kMaxRuleDepth = 32;
-constexpr int kMaxWrittenOut = 400;
-constexpr int kLookAheadWeight = 8;
-constexpr int kBackReferenceWeight = 40;
-
-/// Walks over a rule and counts what compiling it would make of it. Where it is unsure it counts too much.
-class RuleMeasure
-{
-public:
-    explicit RuleMeasure(const QString& rule) : m_rule(rule) {}
-
-    bool isBearable()
-    {
-        for (m_at = 0; m_at < m_rule.size(); ++m_at) {
-            if (!step())
-                return false;
-            if (m_groups.size() > kMaxRuleDepth || m_groups.front().sum > kMaxWrittenOut)
-                return false;
-        }
-        while (m_groups.size() > 1)
-            closeGroup();
-        return m_groups.front().sum <= kMaxWrittenOut;
-    }
-
-private:
-    struct Group {
-        /// Characters in the group, and how many of them the last item has; a repetition multiplies those.
-        int sum = 0;
-        int last = 0;
-        bool looksAhead = false;
-    };
-
-    QChar at(int index) const { return index < m_rule.size() ? m_rule.at(index) : QChar(); }
-
-    bool step()
-    {
-        switch (m_rule.at(m_at).unicode()) {
-        case '(':
-            return openGroup();
-        case ')':
-            if (m_groups.size() > 1)
-                closeGroup();
-            return true;
-        case '{':
-            repeat();
-            return true;
-        case '[':
-            skipClass();
-            break;
-        case '\\':
-            ++m_at;
-            // A reference back is compared anew on every way to it.
-            add(at(m_at).isDigit() ? kBackReferenceWeight : characterWeight());
-            return true;
-        case '*':
-        case '+':
-        case '?':
-            return true;
-        default:
-            break;
-        }
-        add(characterWeight());
-        return true;
-    }
-
-    /// What is looked ahead for is searched again from every character of the name.
-    int characterWeight() const { return m_groups.back().looksAhead ? kLookAheadWeight : 1; }
-
-    bool openGroup()
-    {
-        const bool looksAhead =
-            at(m_at + 1) == QLatin1Char('?') && (at(m_at + 2) == QLatin1Char('=') || at(m_at + 2) == QLatin1Char('!'));
-        const bool within = m_groups.back().looksAhead;
-        m_groups.push_back({0, 0, looksAhead || within});
-        return !(looksAhead && within);
-    }
-
-    void closeGroup()
-    {
-        const int size = m_groups.back().sum;
-        m_groups.pop_back();
-        add(std::max(size, 1));
-    }
-
-    void add(int size)
-    {
-        m_groups.back().last = size;
-        m_groups.back().sum = std::min(m_groups.back().sum + size, kMaxWrittenOut + 1);
-    }
-
-    /// Takes the largest number of "{n}", "{n,}" or "{n,m}"; without a closing brace the rule is invalid anyway.
-    void repeat()
-    {
-        int times = 1;
-        int number = 0;
-        for (++m_at; m_at < m_rule.size() && m_rule.at(m_at) != QLatin1Char('}'); ++m_at) {
-            const int digit = m_rule.at(m_at).digitValue();
-            number = digit < 0 ? 0 : std::min(number * 10 + digit, kMaxWrittenOut + 1);
-            times = std::max(times, number);
-        }
-        const int last = m_groups.back().last;
-        m_groups.back().sum -= last;
-        add(std::min(last * times, kMaxWrittenOut + 1));
-    }
-
-    /// Leaves `m_at` on the closing bracket. The first character never closes the class.
-    void skipClass()
-    {
-        if (at(++m_at) == QLatin1Char('^'))
-            ++m_at;
-        do {
-            if (at(m_at) == QLatin1Char('\\'))
-                ++m_at;
-            ++m_at;
-        } while (m_at < m_rule.size() && m_rule.at(m_at) != QLatin1Char(']'));
-    }
-
-    const QString& m_rule;
-    int m_at = 0;
-    std::vector<Group> m_groups = std::vector<Group>(1);
+/// A rule, or a part of it, with its counted repetitions written out: "a{1,3}" is three characters.
+struct WrittenOut {
+    int characters = 0;
+    /// Parts that may be absent, and alternatives.
+    int choices = 0;
+    /// Of repetitions within repetitions.
+    int depth = 0;
 };
+
+/// The steps of a match are bounded by characters × choices × the length of the name.
+constexpr WrittenOut kMost{512, 32, 2};
+/// What is looked ahead for is searched from many places, so it counts as repeated.
+constexpr int kLookAheadTimes = 16;
+
+WrittenOut operator+(const WrittenOut& a, const WrittenOut& b)
+{
+    return {std::min(a.characters + b.characters, kMost.characters + 1),
+            std::min(a.choices + b.choices, kMost.choices + 1), std::max(a.depth, b.depth)};
+}
+
+WrittenOut repeated(const WrittenOut& part, int times)
+{
+    WrittenOut result{0, 0, part.depth + 1};
+    for (int time = 0; time < std::min(std::max(times, 1), kMost.characters + 1); ++time)
+        result = result + part;
+    return result;
+}
+
+/// `part` with the quantifier behind it: "?", "*", "+", "{n}", "{n,}", "{n,m}" or "{,m}".
+WrittenOut quantified(const WrittenOut& part, const QRegularExpressionMatch& quantifier)
+{
+    const QString sign = quantifier.captured();
+    const int least = sign == QLatin1String("+") ? 1 : quantifier.captured(1).toInt();
+    WrittenOut result = part;
+    if (sign != QLatin1String("?"))
+        result = repeated(part, std::max(least, quantifier.captured(2).toInt()));
+    result.choices += least == 0 ? 1 : 0;
+    return result;
+}
+
+/// The characters and groups up to the end of the rule or of the group that has just been opened.
+WrittenOut readGroup(QRegularExpressionMatchIterator& tokens)
+{
+    WrittenOut before;
+    WrittenOut last;
+    while (tokens.hasNext()) {
+        const QRegularExpressionMatch token = tokens.next();
+        const QString text = token.captured();
+        if (text == QLatin1String(")"))
+            break;
+        if (QStringLiteral("?*+{").contains(text.at(0))) {
+            last = quantified(last, token);
+            continue;
+        }
+        before = before + last;
+        if (text.startsWith(QLatin1Char('('))) {
+            const WrittenOut group = readGroup(tokens);
+            const bool looksAhead = text.endsWith(QLatin1Char('=')) || text.endsWith(QLatin1Char('!'));
+            last = WrittenOut{group.characters == 0 ? 1 : 0, 0, 0} +
+                   (looksAhead ? repeated(group, kLookAheadTimes) : group);
+        } else if (text == QLatin1String("|")) {
+            last = {0, 1, 0};
+        } else {
+            const bool isAnchor = text == QLatin1String("^") || text == QLatin1String("$");
+            last = {isAnchor ? 0 : 1, 0, 0};
+        }
+    }
+    return before + last;
+}
 
 } // namespace
 
@@ -190,17 +137,26 @@ QString withoutSlashes(const QString& rule)
 
 bool isBearableRule(const QString& rule)
 {
-    return rule.size() <= kMaxRuleLength && RuleMeasure(rule).isBearable();
+    // An escaped character, a class, the beginning of a group, a counted repetition, or any one character.
+    static const QRegularExpression kToken(
+        QStringLiteral(R"(\\.|\[\^?(?:\\.|.)(?:\\.|[^\]\\])*\]|\(\?[:=!]|\{(\d*)(?:,(\d*))?\}|.)"),
+        QRegularExpression::DotMatchesEverythingOption);
+    if (rule.size() > kMost.characters)
+        return false;
+    WrittenOut whole;
+    for (QRegularExpressionMatchIterator tokens = kToken.globalMatch(rule); tokens.hasNext();)
+        whole = whole + readGroup(tokens);
+    return whole.characters <= kMost.characters && whole.choices <= kMost.choices && whole.depth <= kMost.depth;
 }
 
 PcNameMatch matchPcName(const QString& rule, const QString& name)
 {
     PcNameMatch match;
-    if (!isBearableRule(rule))
+    if (!isBearableRule(rule) || !QRegExp(rule).isValid())
         return match;
-    const QRegExp expression(rule, Qt::CaseSensitive);
-    match.validRule = expression.isValid();
-    match.found = match.validRule && expression.indexIn(name) >= 0;
+    match.validRule = true;
+    const QRegExp expression(QStringLiteral("^(?:%1)").arg(rule), Qt::CaseSensitive);
+    match.found = expression.indexIn(name) == 0;
     match.whole = match.found && expression.matchedLength() == name.length();
     match.text = match.found ? expression.cap() : QString();
     return match;

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QByteArray>
@@ -38,16 +39,15 @@ PcNameRule parsePcNameRule(const QByteArray& json);
 /// The rule without one leading and one trailing slash, as it may arrive as /pattern/.
 QString withoutSlashes(const QString& rule);
 
-/// Whether the rule may be compiled. The old regular expressions are matched without backtracking, but a few bytes
-/// from the server could keep them compiling or looking ahead for hours, or overflow the stack: counted repetitions
-/// multiply, and a group inside a group is a deeper call. Bounded are the length, the depth of groups, the number of
-/// characters that is left when every counted repetition is written out (a reference back, and a character that is
-/// looked ahead for, count many times), and looking ahead while looking ahead.
+/// Whether the rule may be compiled: a few bytes from the server could otherwise keep the client busy for minutes. With
+/// "a{1,3}" counted as three characters, a rule may have at most 512 characters and at most 32 choices: parts that may
+/// be absent ("?", "*", "{0,n}") and alternatives ("|"). Repetitions stand within repetitions at most two deep. What
+/// is looked ahead for counts 16 times, and as a repetition.
 bool isBearableRule(const QString& rule);
 
-/// What a naming rule finds in a name.
+/// What a naming rule matches of a name.
 struct PcNameMatch {
-    /// False when the rule is no regular expression, or not a bearable one; nothing is searched then.
+    /// False when the rule is no regular expression, or not a bearable one; nothing is matched then.
     bool validRule = false;
     bool found = false;
     /// The match is the whole name.
@@ -55,7 +55,8 @@ struct PcNameMatch {
     QString text;
 };
 
-/// The first match of `rule`, case-sensitive and in the old syntax, in `name`.
+/// The longest match of `rule`, case-sensitive and in the old syntax, at the beginning of `name`. One that begins later
+/// cannot be the whole name, and looking for it would start anew at every character.
 PcNameMatch matchPcName(const QString& rule, const QString& name);
 
 } // namespace zent

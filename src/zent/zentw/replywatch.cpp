@@ -1,13 +1,11 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "replywatch.h"
-
-#include "replylimit.h"
 
 #include <QDebug>
 #include <QNetworkAccessManager>
 #include <QNetworkReply>
 #include <QTimer>
 
-#include <algorithm>
 #include <malloc.h>
 
 namespace zent
@@ -16,27 +14,9 @@ namespace zent
 namespace
 {
 
-constexpr int kHttpOk = 200;
-constexpr int kFirstErrorStatus = 400;
-constexpr char kTooLarge[] = "tooLarge";
-
-int statusOf(const QNetworkReply* reply)
-{
-    return reply->attribute(QNetworkRequest::HttpStatusCodeAttribute).toInt();
-}
-
 const char* methodOf(const QNetworkReply* reply)
 {
     return reply->operation() == QNetworkAccessManager::PutOperation ? "PUT" : "GET";
-}
-
-QString reasonOf(const QNetworkReply* reply)
-{
-    if (reply->property(kTooLarge).toBool())
-        return QStringLiteral("the reply is over %1 MiB").arg(http::kMaxReplyBytes >> 20);
-    // The words for a status hold the whole URL.
-    const bool answered = reply->error() == QNetworkReply::NoError || statusOf(reply) >= kFirstErrorStatus;
-    return answered ? QStringLiteral("status %1").arg(statusOf(reply)) : reply->errorString();
 }
 
 /// Whether the connection broke, or never came about, as opposed to an answer that tells of an error.
@@ -45,48 +25,40 @@ bool connectionFailed(const QNetworkReply* reply)
     return reply->error() != QNetworkReply::NoError && reply->error() < QNetworkReply::ContentAccessDenied;
 }
 
-/// Has the manager forget its connections, unless one is in use. Qt otherwise goes on with the broken one, and of every
-/// TLS session that it then starts on it it keeps the one before, some 13 KiB.
-void dropConnections(QNetworkAccessManager* manager)
-{
-    // Later: the reply that failed is still being finished.
-    QMetaObject::invokeMethod(
-        manager,
-        [manager] {
-            const QList<QNetworkReply*> replies = manager->findChildren<QNetworkReply*>();
-            if (std::all_of(replies.begin(), replies.end(), [](auto* reply) { return reply->isFinished(); }))
-                manager->clearConnectionCache();
-        },
-        Qt::QueuedConnection);
-}
-
 } // namespace
 
-void watchReply(QNetworkReply* reply)
+bool dropConnections(QNetworkAccessManager* manager)
 {
-    // Nobody reads before the end, so what is there is the whole body so far.
-    QObject::connect(reply, &QNetworkReply::readyRead, reply, [reply] {
-        if (reply->bytesAvailable() <= http::kMaxReplyBytes)
-            return;
-        reply->setProperty(kTooLarge, true);
-        reply->abort();
-    });
+    if (!manager->findChildren<QNetworkReply*>().isEmpty())
+        return false;
+    manager->clearConnectionCache();
+    return true;
+}
+
+void watchReply(QNetworkReply* reply, std::chrono::milliseconds time)
+{
+    http::limitReply(reply);
+    http::limitTime(reply, time);
     QObject::connect(reply, &QNetworkReply::finished, reply, [reply] {
         if (succeeded(reply))
             return;
-        qWarning() << methodOf(reply) << reply->url().toString(QUrl::RemoveQuery | QUrl::RemoveUserInfo)
-                   << "failed:" << qPrintable(reasonOf(reply));
-        if (connectionFailed(reply))
-            dropConnections(reply->manager());
+        qWarning() << methodOf(reply) << http::logUrl(reply->url()) << "failed:" << qPrintable(http::failureOf(reply));
+        if (!connectionFailed(reply))
+            return;
+        // Qt would reuse the broken connection. Each new TLS session on it leaks the previous one, about 13 KiB. This
+        // waits until the reply is gone, because the reply may still use the connection.
+        QNetworkAccessManager* manager = reply->manager();
+        QObject::connect(
+            reply, &QObject::destroyed, manager, [manager] { dropConnections(manager); }, Qt::QueuedConnection);
     });
-    // Once a reply is done with, and a poll comes every minute or two, what lies free between blocks in use, such as
-    // the pieces of a large body or a closed dialog, goes back to the system; the C library would keep it.
+    // The C library keeps free memory that lies between blocks in use, such as the pieces of a large body. It goes back
+    // to the system after each reply; polls bring one every minute or two.
     QObject::connect(reply, &QObject::destroyed, [] { QTimer::singleShot(0, [] { malloc_trim(0); }); });
 }
 
 bool succeeded(const QNetworkReply* reply)
 {
-    return reply->error() == QNetworkReply::NoError && statusOf(reply) == kHttpOk;
+    return reply->error() == QNetworkReply::NoError && http::statusOf(reply) == http::kOk;
 }
 
 } // namespace zent

@@ -1,10 +1,9 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "boxcloser.h"
-#include "logcapture.h"
+#include "fixture.h"
 #include "modifydialog.h"
 #include "paths.h"
 #include "platformcontrol.h"
-#include "testfiles.h"
-#include "testrows.h"
 #include "toolkitpasswordedit.h"
 
 #include <QPushButton>
@@ -14,8 +13,6 @@ namespace
 
 const QString kOld = QStringLiteral("Zent@2026");
 const QString kNew = QStringLiteral("Neu-%1\"\\密码8");
-const QString kNotChanged = QStringLiteral("修改密码失败");
-const QString kChangedThere = QStringLiteral("密码修改成功");
 
 } // namespace
 
@@ -40,6 +37,18 @@ class TestModifyDialog : public QObject
         old()->setText(oldText);
         fresh()->setText(newText);
         repeat()->setText(repeated);
+    }
+
+    /// What was in the field after each thing that may restore a text.
+    static QString broughtBack(ToolkitPasswordEdit* field)
+    {
+        QTest::keyClick(field, Qt::Key_R, Qt::ControlModifier);
+        QString texts;
+        for (const auto key : {QKeySequence::Undo, QKeySequence::Undo, QKeySequence::Redo}) {
+            QTest::keySequence(field, key);
+            texts += field->text();
+        }
+        return texts;
     }
 
 private slots:
@@ -77,40 +86,27 @@ private slots:
         m_platform.patchState({{"users", QJsonObject{{"zhangsan", QJsonObject{{"password", kOld}}}}}});
     }
 
-    void serviceAnswers_data()
-    {
-        addColumns<QJsonObject, QString, QStringList>("action", "alerts", "notices");
-        const auto value = [](const QString& text) { return QJsonObject{{"value", text}}; };
-        addRow("text code", value(R"({"code": "-500", "msg": "m"})"), "closes", QStringList());
-        addRow("-500", value(R"({"code": -500, "msg": "<b>%1</b>"})"), "|<b>%1</b>", QStringList());
-        addRow("-100002", value(R"({"code": -100002, "msg": "<b>%1</b>"})"), "<b>%1</b>|", QStringList());
-        addRow("other", value(R"({"code": -1, "msg": "<b>%1</b>"})"), "|", QStringList("<b>%1</b>"));
-        addRow("no code", value(R"({"Code": 0})"), "|", QStringList(kNotChanged));
-        addRow("a number", QJsonObject{{"value", 0}, {"signature", "i"}}, "|", QStringList(kNotChanged));
-        addRow("error", QJsonObject{{"error", "org.freedesktop.DBus.Error.AccessDenied"}}, "|",
-               QStringList(kNotChanged));
-        addRow("hangs until it ends", QJsonObject{{"vanish", true}, {"delay_ms", 500}}, "|", QStringList(kNotChanged));
-    }
+    void serviceAnswers_data() { fixture::addRows("passwordanswers.json"); }
     void serviceAnswers()
     {
-        QFETCH(QJsonObject, action);
-        QFETCH(QString, alerts);
-        QFETCH(QStringList, notices);
-        const bool closes = alerts == "closes";
-        m_platform.addFault({{"dbus", "ModifyUserPassword"}}, action);
+        QFETCH(QJsonObject, row);
+        m_platform.addFault({{"dbus", "ModifyUserPassword"}}, row["action"].toObject());
         fill(kOld, kNew, kNew);
         confirm()->click();
         m_platform.patchState({{"services", QJsonObject{{"iam", true}}}});
-        QCOMPARE(m_dialog->isHidden(), closes);
-        QCOMPARE(old()->alertMessage() + '|' + fresh()->alertMessage(), closes ? QString("|") : alerts);
-        QCOMPARE(m_boxes.texts, notices);
-        QCOMPARE(repeat()->text(), closes ? QString() : kNew);
+        QCOMPARE(m_dialog->isHidden(), row["closes"].toBool());
+        QCOMPARE(old()->alertMessage(), row["old"].toString());
+        QCOMPARE(fresh()->alertMessage(), row["new"].toString());
+        fixture::compare(QJsonArray::fromStringList(m_boxes.texts), row["boxes"]);
+        QCOMPARE(repeat()->text(), row["closes"].toBool() ? QString() : kNew);
     }
 
     void everyOpeningStartsEmpty()
     {
         for (const bool byKey : {true, false}) {
-            fill("a", "abc", "abd");
+            m_dialog->show();
+            for (ToolkitPasswordEdit* field : {old(), fresh(), repeat()})
+                QTest::keyClicks(field, field == repeat() ? "abd" : "abc");
             m_dialog->onRepasswordeditFinished();
             QVERIFY(repeat()->isAlert());
             if (byKey)
@@ -120,31 +116,52 @@ private slots:
             QVERIFY(m_dialog->isHidden() && !repeat()->isAlert());
             // Not only before the next opening: nothing typed stays in the memory of a closed dialog.
             QCOMPARE(old()->text() + fresh()->text() + repeat()->text(), QString());
+            m_dialog->show();
+            for (ToolkitPasswordEdit* field : {old(), fresh(), repeat()})
+                QCOMPARE(broughtBack(field), QString());
         }
     }
 
-    void serverReplies_data()
+    void minimumLengths_data() { fixture::addRows("passwordlengths.json"); }
+    void minimumLengths()
     {
-        addColumns<QString, QString, QString>("body", "token", "notice");
-        addRow("good", "{\"code\": 0, \"message\": \"T-1.a\\\"b令牌\"}", "T-1.a\"b令牌", kChangedThere);
-        addRow("good, no token", R"({"code": 0})", "", kChangedThere);
-        addRow("refused", R"({"code": 3, "data": "no <i>", "message": "T"})", "", "no <i>");
-        addRow("text code", R"({"code": "0", "message": "T"})", "", kNotChanged);
+        QFETCH(QJsonObject, row);
+        const QByteArray policy = row["policy"].toString().toUtf8();
+        const int length = row["length"].toInt();
+        const QString path = QStringLiteral("/usr/share/lumo/test-scene/pc_config.json");
+        const auto fits = [this](int characters) {
+            repeat()->setText(QString(characters, 'x'));
+            return m_dialog->IsPasswordLenthValid();
+        };
+        for (const QByteArray& content : {QByteArray(R"({"pam_cracklib": {"minlen": 12}})"), policy}) {
+            testfiles::write(path, content);
+            m_dialog->IsPasswordLenthValid();
+        }
+        const LogCapture log;
+        QVERIFY(fits(length) && (length == 0 || !fits(length - 1)));
+        QFile::setPermissions(path, {});
+        QVERIFY(fits(length));
+        testfiles::remove(path);
+        QCOMPARE(fits(length), length != 0);
+        for (const QString& line : {QString("file open successfully!"), QString("file open failed!"),
+                                    QString("no pc_config.json to use sceneCode: \"test-scene\""),
+                                    QString("@@@@@@@@@@@@@: passwd limit : %1").arg(length)})
+            QVERIFY2(log.contains(line), qPrintable(line));
     }
+
+    void serverReplies_data() { fixture::addRows("passwordreplies.json"); }
     void serverReplies()
     {
-        QFETCH(QString, body);
-        QFETCH(QString, token);
-        QFETCH(QString, notice);
-        const bool good = notice == kChangedThere;
+        QFETCH(QJsonObject, row);
+        const bool good = row["good"].toBool();
         m_dialog->show();
-        QByteArray reply = body.toUtf8();
+        QByteArray reply = row["body"].toString().toUtf8();
         QCOMPARE(m_dialog->analyseData(&reply), good);
-        QCOMPARE(m_boxes.texts, QStringList{notice});
+        QCOMPARE(m_boxes.texts, QStringList{row["box"].toString()});
         QCOMPARE(m_dialog->isHidden(), good);
         QJsonObject expected = QJsonDocument::fromJson(m_info).object();
-        if (!token.isEmpty())
-            expected["token"] = token;
+        if (row.contains("token"))
+            expected["token"] = row["token"];
         QCOMPARE(QJsonDocument::fromJson(testfiles::read(zent::kUserinfoPath)).object(), expected);
         QTRY_COMPARE(m_platform.record("process").size(), good ? 1 : 0);
         QCOMPARE(m_platform.record("process").value(0).value("token_ok").toBool(), good);
@@ -162,6 +179,13 @@ private slots:
             QCOMPARE(testfiles::read(zent::kUserinfoPath), QByteArray(content));
             QCOMPARE(m_boxes.texts.filter("域管终端提示").size(), 1);
         }
+        testfiles::write(zent::kUserinfoPath, m_info);
+        QFile::setPermissions(zent::kUserinfoPath, QFile::ReadOwner);
+        m_boxes.texts.clear();
+        m_dialog->renewToken("T");
+        testfiles::remove(zent::kUserinfoPath);
+        QCOMPARE(m_boxes.texts.filter("读取/etc/zent/userinfo.json失败，错误原因是：Permission denied").size(), 1);
+        QVERIFY(m_log->contains("no config.json to use, error code:  5 , error detail:  \"Permission denied\""));
         // The dialog may go while the first notice is open.
         QByteArray body("{\"code\": 0, \"message\": \"T\"}");
         m_boxes.texts.clear();

@@ -1,7 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "controlmanagerthread.h"
+#include "fixture.h"
 #include "processrecord.h"
-#include "testrows.h"
-#include "thirdscript.h"
 #include "upgradepriority.h"
 
 #include <atomic>
@@ -12,10 +12,9 @@ namespace
 {
 
 const QString kFrontEnd = QStringLiteral("fenx-cli.bash");
-constexpr int kNoInterpreter = -1;
 
 /// The pauses in seconds that have been asked for, in order, where a test looks at them.
-QStringList* pauses = nullptr;
+QJsonArray* pauses = nullptr;
 
 } // namespace
 
@@ -25,8 +24,7 @@ extern "C" int nanosleep(const timespec* duration, timespec* rest)
 {
     if (!pauses)
         return clock_nanosleep(CLOCK_MONOTONIC, 0, duration, rest) == 0 ? 0 : -1;
-    pauses->append(
-        QString::number(static_cast<double>(duration->tv_sec) + static_cast<double>(duration->tv_nsec) / 1e9));
+    pauses->append(static_cast<double>(duration->tv_sec) + static_cast<double>(duration->tv_nsec) / 1e9);
     return 0;
 }
 
@@ -41,39 +39,56 @@ private slots:
     void initTestCase() { QVERIFY2(qEnvironmentVariableIsSet("ROOM"), "runs inside a room only"); }
     void init() { processrecord::clear(); }
 
-    void attempts_data()
-    {
-        addColumns<bool, bool, int, int, int, QString>("detached", "flag", "status", "result", "starts", "pauses");
-        addRow("once, fails", false, true, 7, 7, 1, "");
-        addRow("repeated, good at once", false, false, 0, 0, 1, "1");
-        addRow("repeated, fails", false, false, 7, 7, 3, "1 2 3");
-        addRow("repeated, no interpreter", false, false, kNoInterpreter, -2, 3, "1 2 3");
-        addRow("detached, once", true, false, 7, 1, 1, "1");
-        addRow("detached, three times", true, true, 7, 1, 3, "1 2 3 1");
-        addRow("detached, three times, no interpreter", true, true, kNoInterpreter, 0, 1, "1 1");
-    }
+    void attempts_data() { fixture::addRows("scriptattempts.json"); }
     void attempts()
     {
-        QFETCH(bool, detached);
-        QFETCH(bool, flag);
-        QFETCH(int, status);
-        QFETCH(int, starts);
+        QFETCH(QJsonObject, row);
         const QString standin = qEnvironmentVariable("ROOM") + "/standin/" + kFrontEnd + ".rc";
-        testfiles::write(standin, QByteArray::number(status));
+        testfiles::write(standin, QByteArray::number(row["status"].toInt()));
         UpgradePriority* runner = UpgradePriority::GetInstance();
         const QByteArray searchPath = qgetenv("PATH");
-        if (status == kNoInterpreter)
+        // Without an interpreter nothing starts.
+        if (row["status"] == "none")
             qputenv("PATH", "/nowhere");
-        QStringList asked;
+        QJsonArray asked;
         pauses = &asked;
+        const QStringList script{"/a.bash", "x"};
+        const bool flag = row["flag"].toBool();
         const int result =
-            detached ? runner->upgradeScriptAsy({"/a.bash", "x"}, flag) : runner->upgradeScript({"/a.bash", "x"}, flag);
+            row["detached"].toBool() ? runner->upgradeScriptAsy(script, flag) : runner->upgradeScript(script, flag);
         pauses = nullptr;
         qputenv("PATH", searchPath);
-        QTEST(result, "result");
-        QTEST(asked.join(' '), "pauses");
-        QTRY_COMPARE(runs(), status == kNoInterpreter ? 0 : starts);
+        QCOMPARE(result, row["result"].toInt());
+        fixture::compare(asked, row["pauses"]);
+        QTRY_COMPARE(runs(), row["starts"].toInt());
         testfiles::remove(standin);
+    }
+
+    void wordsOfAScript_data() { fixture::addRows("scriptrunners.json"); }
+    void wordsOfAScript()
+    {
+        QFETCH(QJsonObject, row);
+        const bool detached = row["detached"].toBool();
+        // Made once with sha256sum.
+        const QString token = "3752f999dbc1764f8ffc2e6fdc836702f6c1e31780c0720f38b9990412f4c1f3";
+        const QStringList expected{"--cmd", "thirdscript", "--thirdscript", "/a.bash", "--args", token, "x", "y z"};
+        const LogCapture log;
+        UpgradePriority* runner = UpgradePriority::GetInstance();
+        const QStringList list{"/a.bash", "x", "y z"};
+        const int result = detached ? runner->upgradeScriptAsy(list, false) : runner->upgradeScript(list, true);
+        QCOMPARE(result, detached ? 1 : 0);
+        QTRY_COMPARE(runs(), 1);
+        QCOMPARE(processrecord::words(processrecord::entries(kFrontEnd).first()), expected);
+        QStringList lines;
+        const QString function = QTest::currentDataTag();
+        for (const QString& word : list)
+            lines.append(function + "  strScriptPath: \"" + word + '"');
+        for (const QString& word : list.mid(1))
+            lines.append(function + "  strList: \"" + word + '"');
+        for (const QString& word : QStringList("/opt/vantor/lumo/fenx/fenx-cli.bash") + expected)
+            lines.append(function + "  strCmdList: \"" + word + '"');
+        lines.append(function + "  nRet: " + QString::number(result));
+        QCOMPARE(log.lines(), lines);
     }
 
     void workerMakesOnePassPerCall()

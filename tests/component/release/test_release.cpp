@@ -1,17 +1,19 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "boxcloser.h"
 #include "closeguarddialog.h"
-#include "logcapture.h"
+#include "desktopsettings.h"
+#include "fixture.h"
 #include "paths.h"
 #include "platformcontrol.h"
 #include "spinerwin.h"
-#include "testfiles.h"
-#include "testrows.h"
-#include "thirdscript.h"
 #include "toolkitpasswordedit.h"
+#include "toolkitspinner.h"
 
 #include <QElapsedTimer>
-#include <QProcess>
+#include <QLabel>
 #include <QPushButton>
+#include <QScreen>
+#include <QSignalSpy>
 
 namespace
 {
@@ -20,53 +22,6 @@ const QString kAdministratorPassword = QStringLiteral("Admin@2026");
 const QString kOk = QStringLiteral("确定");
 const QString kNow = QStringLiteral("立即重启");
 const QString kLater = QStringLiteral("稍后重启");
-const QString kNetworkText = QStringLiteral("网络异常，请稍后重试");
-const QString kSaid = QStringLiteral("服务器说明");
-const QString kDirectoryScript = QStringLiteral("/usr/share/lumo/restore_ldap.bash");
-/// A reply of the server with that result.
-QJsonObject answer(int code, const QJsonValue& result, int status = 200)
-{
-    const QJsonObject reply{{"code", code}, {"msg", kSaid}, {"data", QJsonObject{{"result", result}}}};
-    return {{"status", status}, {"body", QString::fromUtf8(QJsonDocument(reply).toJson())}};
-}
-
-/// Sets everything that a release changes to what it is not afterwards.
-const char* const kManage = R"(set -e
-set_lock="gsettings set com.vantor.zent.lockdown"
-for key in $(gsettings list-keys com.vantor.zent.lockdown | grep "able$" | grep -v hotspot); do
-    $set_lock $key false
-done
-$set_lock hotspot-enable 0
-$set_lock control-center-hidden '["accounts"]'
-set_center="gsettings set com.vantor.oxa.control-center"
-$set_center auto-login-visable true
-$set_center nopasswd-login-visable true
-$set_center hide-module '["accounts"]')";
-
-const QStringList kReleased{"auto-login-visable false",
-                            "hide-module @as []",
-                            "nopasswd-login-visable false",
-                            " 1 1",
-                            " 1 ['']",
-                            " 1 ['accounts', 'network']",
-                            " 7 true"};
-
-/// The output of a shell command, which reads and sets the desktop's settings with the desktop's own tool.
-QStringList shell(const QString& command)
-{
-    QProcess program;
-    program.start("/bin/sh", {"-c", command});
-    if (!program.waitForFinished() || program.exitCode() != 0)
-        qFatal("%s: %s", qPrintable(command), program.readAllStandardError().constData());
-    return QString::fromUtf8(program.readAllStandardOutput()).split('\n', Qt::SkipEmptyParts);
-}
-
-/// The control center's keys and values, and how many of the lock-down's keys have which value.
-QStringList settings()
-{
-    return shell("export LC_ALL=C; gsettings list-recursively com.vantor.oxa.control-center | cut -d' ' -f2- | sort; "
-                 "gsettings list-recursively com.vantor.zent.lockdown | cut -d' ' -f3- | sort | uniq -c | tr -s ' '");
-}
 
 } // namespace
 
@@ -139,8 +94,8 @@ private slots:
         m_platform.clearFaults();
         m_platform.patchState({{"services", QJsonObject{{"zentg", true}, {"iam", true}, {"login1", true}}},
                                {"iam", QJsonObject{{"enable", true}, {"read_only", false}}}});
-        shell(kManage);
-        m_managed = settings();
+        desktopsettings::manage();
+        m_managed = desktopsettings::values();
         testfiles::remove("/tmp/zent");
         m_boxes.texts.clear();
         m_log = std::make_unique<LogCapture>();
@@ -154,27 +109,52 @@ private slots:
         m_log.reset();
     }
 
-    void refusedPasswordChangesNothing_data()
+    void spinnerTellsOfItsEnd()
     {
-        addColumns<QJsonObject, QString>("fault", "box");
-        addRow("wrong password", QJsonObject(), QStringLiteral("管理员账号或密码错误"));
-        addRow("500 with a good body", answer(0, true, 500), kNetworkText);
-        addRow("result not a boolean", answer(0, "true"), kSaid);
-        addRow("code 1 with result true", answer(1, true), kSaid);
-        addRow("not JSON", QJsonObject{{"body", "<html>"}}, "");
+        QSignalSpy ended(spinner(), &spinerWin::uploadcloseguard);
+        QSignalSpy closed(spinner(), &spinerWin::closeFatherwin);
+        spinner()->show();
+        spinner()->close();
+        QVERIFY(spinner()->isVisible());
+        QCOMPARE(closed.size() + ended.size(), 0);
+        spinner()->onRemoveController();
+        QCOMPARE(ended.size(), 1);
+        QCOMPARE(closed.size(), 0);
+        // Once for the click, once for the window that closes.
+        QTRY_VERIFY(button(kLater));
+        button(kLater)->click();
+        QVERIFY(!spinner()->isVisible());
+        QCOMPARE(closed.size(), 2);
+        spinner()->show();
+        spinner()->close();
+        QCOMPARE(closed.size(), 3);
+        QCOMPARE(ended.size(), 1);
     }
+
+    void dialogTellsItsFatherToClose()
+    {
+        QSignalSpy closed(m_dialog.get(), &closeGuarddialog::closeall);
+        m_dialog->closeallfather();
+        QCOMPARE(closed.size(), 1);
+        m_dialog->show();
+        m_dialog->findChild<QPushButton*>("close")->click();
+        QVERIFY(!m_dialog->isVisible());
+        QCOMPARE(m_dialog->result(), static_cast<int>(QDialog::Accepted));
+        QCOMPARE(closed.size(), 1);
+    }
+
+    void refusedPasswordChangesNothing_data() { fixture::addRows("releaserefusals.json"); }
     void refusedPasswordChangesNothing()
     {
-        QFETCH(QJsonObject, fault);
-        QFETCH(QString, box);
-        const QString typed = fault.isEmpty() ? "No-such@pass" : kAdministratorPassword;
-        if (!fault.isEmpty())
-            m_platform.addFault({{"path", "*/remove_status"}}, fault);
+        QFETCH(QJsonObject, row);
+        const QString typed = row["typed"].toString();
+        if (row.contains("reply"))
+            m_platform.addFault({{"path", "*/remove_status"}}, row["reply"].toObject());
         attempt(typed);
-        QTRY_COMPARE(m_boxes.texts, QStringList({box}));
-        QTRY_COMPARE(password()->text(), box.isEmpty() ? typed : QString());
+        QTRY_COMPARE(m_boxes.texts, QStringList({row["box"].toString()}));
+        QTRY_COMPARE(password()->text(), row["kept"].toString());
         QVERIFY(m_dialog->isVisible() && !spinner()->isVisible());
-        QCOMPARE(settings(), m_managed);
+        QCOMPARE(desktopsettings::values(), m_managed);
         QVERIFY(!QFile::exists(zent::kTmpUserinfoPath));
         QCOMPARE(record("dbus") + record("process"), QStringList());
         verifyKeptSecret(typed);
@@ -185,28 +165,28 @@ private slots:
 
     void acceptedPasswordReleasesTheTerminal()
     {
+        const auto* circle = spinner()->findChild<ToolkitSpinner*>();
+        spinner()->move(1, 1);
         attempt(kAdministratorPassword);
         QTRY_VERIFY(button(kOk));
-        QVERIFY(!button(kOk)->isEnabled() && !button(kNow));
+        QVERIFY(!button(kOk)->isEnabled() && !button(kNow) && circle->isVisible());
+        const QPoint offset = spinner()->geometry().center() - spinner()->screen()->geometry().center();
+        QVERIFY2(offset.manhattanLength() <= 2, qPrintable(QString("%1 %2").arg(offset.x()).arg(offset.y())));
         QCOMPARE(password()->text(), QString());
         QTest::keyClick(spinner(), Qt::Key_Escape);
         QVERIFY(spinner()->isVisible());
-        QTRY_VERIFY(button(kNow) && !button(kOk));
+        QTRY_VERIFY(button(kNow) && !button(kOk) && !circle->isVisible());
         QTRY_COMPARE(quits(), 1);
         QTRY_COMPARE(record("process").size(), 5);
-        QTRY_COMPARE(settings(), kReleased);
+        const QJsonObject expected = fixture::read("release.json");
+        QTRY_COMPARE(desktopsettings::values(), expected["settings"].toVariant().toStringList());
         button(kNow)->click();
-
-        QCOMPARE(record("http"), QStringList({"remove_status zhangsan " + kAdministratorPassword, "remove zhangsan "}));
-        QCOMPARE(record("dbus"), QStringList({"com.vantor.zent.zentg onDomainConfig remove",
-                                              "com.vantor.zent.iam Set com.vantor.zent.iam Enable false",
-                                              "org.freedesktop.login1 Reboot true"}));
+        for (const char* kind : {"http", "dbus"})
+            fixture::compare(QJsonArray::fromStringList(record(kind)), expected[kind]);
         QStringList processes = record("process");
         processes.sort();
-        QCOMPARE(processes, QStringList({"fenx-cli.bash --cmd thirdscript --thirdscript " + kDirectoryScript +
-                                             " --args " + zent::thirdScriptToken(kDirectoryScript) + " accepted",
-                                         "systemctl --global disable tarn", "systemctl --global disable zents",
-                                         "systemctl --global stop tarn", "systemctl --global stop zents"}));
+        fixture::compare(QJsonArray::fromStringList(processes), expected["process"]);
+        fixture::compareLog(*m_log, expected["log"]);
         const QJsonObject info = QJsonDocument::fromJson(testfiles::read(zent::kTmpUserinfoPath)).object();
         QCOMPARE(info.value("is_Domain"), QJsonValue(false));
         QCOMPARE(m_boxes.texts, QStringList());
@@ -222,53 +202,20 @@ private slots:
         QTRY_COMPARE(record("process").size(), 10);
     }
 
-    void failingStepStillEndsInThePrompt_data()
-    {
-        addColumns<QJsonObject, QString, QJsonObject, QString>("state", "method", "fault", "box");
-        const QString leave = QStringLiteral("退域执行失败!");
-        const QString disable = QStringLiteral("退域执行失败");
-        const QJsonObject none;
-        const QJsonObject error{{"error", "com.vantor.Error.Busy"}};
-        const QJsonObject text{{"value", "0"}, {"signature", "s"}};
-        const QJsonObject hangs{{"vanish", true}, {"delay_ms", 500}};
-        addRow("agent fails", none, "onDomainConfig", error, leave);
-        addRow("agent answers a text", none, "onDomainConfig", text, leave);
-        addRow("no agent", QJsonObject{{"services", QJsonObject{{"zentg", false}}}}, "", none, leave);
-        addRow("identity service hangs until it ends", none, "Set", hangs, disable);
-        addRow("Enable is read-only", QJsonObject{{"iam", QJsonObject{{"read_only", true}}}}, "", none, disable);
-    }
+    void failingStepStillEndsInThePrompt_data() { fixture::addRows("releasefailures.json"); }
     void failingStepStillEndsInThePrompt()
     {
-        QFETCH(QJsonObject, state);
-        QFETCH(QString, method);
-        QFETCH(QJsonObject, fault);
-        QFETCH(QString, box);
-        if (!state.isEmpty())
-            m_platform.patchState(state);
-        if (!fault.isEmpty())
-            m_platform.addFault({{"dbus", method}}, fault);
+        QFETCH(QJsonObject, row);
+        if (row.contains("state"))
+            m_platform.patchState(row["state"].toObject());
+        if (row.contains("fault"))
+            m_platform.addFault({{"dbus", row["method"]}}, row["fault"].toObject());
         attempt(kAdministratorPassword);
         QTRY_VERIFY(spinner()->isVisible());
         QTRY_VERIFY(button(kNow));
-        QTRY_COMPARE(m_boxes.texts, QStringList{box});
+        QTRY_COMPARE(m_boxes.texts, QStringList{row["box"].toString()});
         QCOMPARE(quits(), 0);
         QTRY_COMPARE(record("process").size(), 5);
-    }
-
-    void refusedRebootCanBeTriedAgain()
-    {
-        m_platform.addFault({{"dbus", "Reboot"}}, {{"vanish", true}, {"delay_ms", 500}});
-        spinner()->show();
-        spinner()->onRemoveController();
-        QTRY_VERIFY(button(kNow));
-        // A line for the try and one for what it met.
-        for (const int lines : {2, 1}) {
-            const LogCapture log;
-            button(kNow)->click();
-            QCOMPARE(log.count("reboot"), lines);
-            m_platform.clearFaults();
-            m_platform.patchState({{"services", QJsonObject{{"login1", true}}}});
-        }
     }
 
     void hungAgentFreezesNothing()

@@ -1,10 +1,8 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "desktopnotifier.h"
-#include "logcapture.h"
-#include "testrows.h"
+#include "fixture.h"
+#include "notificationserver.h"
 
-#include <QDBusConnection>
-#include <QDBusContext>
-#include <QDBusMessage>
 #include <QDBusServiceWatcher>
 #include <QSignalSpy>
 
@@ -13,69 +11,7 @@
 namespace
 {
 
-const QString kService = QStringLiteral("org.freedesktop.Notifications");
-const QString kPath = QStringLiteral("/org/freedesktop/Notifications");
 const QString kSender = QStringLiteral("管理员");
-
-/// A notification service of the desktop, on a connection of its own.
-class FakeServer : public QObject, protected QDBusContext
-{
-    Q_OBJECT
-    Q_CLASSINFO("D-Bus Interface", "org.freedesktop.Notifications")
-
-public:
-    explicit FakeServer(const QStringList& capabilities) : capabilities(capabilities)
-    {
-        static int number = 0;
-        m_name = QString("server%1").arg(++number);
-        QDBusConnection bus = QDBusConnection::connectToBus(QDBusConnection::SessionBus, m_name);
-        if (!bus.registerObject(kPath, this, QDBusConnection::ExportAllSlots | QDBusConnection::ExportAllSignals) ||
-            !bus.registerService(kService))
-            qFatal("cannot own %s", qPrintable(kService));
-    }
-    ~FakeServer() override { QDBusConnection::disconnectFromBus(m_name); }
-
-    QStringList capabilities;
-    /// The method that does not answer as it should, and what it does instead: "hang", "fail" or this text.
-    QString failing;
-    QString instead;
-    int asked = 0;
-    QList<QVariantList> shown;
-    uint lastId = 100;
-
-public slots:
-    QStringList GetCapabilities()
-    {
-        ++asked;
-        answer("GetCapabilities");
-        return capabilities;
-    }
-    uint Notify(const QString& application, uint replaces, const QString& icon, const QString& summary,
-                const QString& body, const QStringList& actions, const QVariantMap& hints, int timeout)
-    {
-        shown.append({application, replaces, icon, summary, body, actions, hints, timeout});
-        answer("Notify");
-        return ++lastId;
-    }
-
-signals:
-    void ActionInvoked(uint id, const QString& action);
-    void NotificationClosed(uint id, uint reason);
-
-private:
-    void answer(const QString& method)
-    {
-        if (failing != method)
-            return;
-        if (instead == "fail")
-            return sendErrorReply(QDBusError::Failed, "the server says no");
-        setDelayedReply(true);
-        if (instead != "hang")
-            QDBusConnection(m_name).send(message().createReply(instead));
-    }
-
-    QString m_name;
-};
 
 } // namespace
 
@@ -84,14 +20,14 @@ class TestDesktopNotifier : public QObject
     Q_OBJECT
 
     std::unique_ptr<DesktopNotifier> m_notifier;
-    std::unique_ptr<FakeServer> m_server;
+    std::unique_ptr<NotificationServer> m_server;
     std::unique_ptr<QSignalSpy> m_activated;
     std::unique_ptr<QSignalSpy> m_unavailable;
 
     void startServer(const QStringList& capabilities = {"actions", "body", "body-markup"})
     {
         m_server.reset();
-        m_server = std::make_unique<FakeServer>(capabilities);
+        m_server = std::make_unique<NotificationServer>(capabilities);
     }
 
     /// Lets everything arrive that was under way before: the bus keeps the order of a connection's messages.
@@ -154,7 +90,8 @@ private slots:
         startServer();
         showOne();
         const uint ours = m_server->lastId;
-        QDBusMessage forged = QDBusMessage::createSignal(kPath, kService, "ActionInvoked");
+        QDBusMessage forged =
+            QDBusMessage::createSignal(NotificationServer::path(), NotificationServer::service(), "ActionInvoked");
         forged << ours << "default";
         QDBusConnection stranger = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "stranger");
         QVERIFY(stranger.send(forged));
@@ -171,25 +108,14 @@ private slots:
         QCOMPARE(m_activated->size(), 1);
     }
 
-    void failureIsReported_data()
-    {
-        addColumns<QString, QString>("failing", "instead");
-        addRow("no service", "", "");
-        addRow("capabilities fail", "GetCapabilities", "fail");
-        addRow("capabilities are a text", "GetCapabilities", "body");
-        addRow("capabilities hang", "GetCapabilities", "hang");
-        addRow("notify fails", "Notify", "fail");
-        addRow("notify gives a text", "Notify", "101");
-        addRow("notify hangs", "Notify", "hang");
-    }
+    void failureIsReported_data() { fixture::addRows("notifierfailures.json"); }
     void failureIsReported()
     {
-        QFETCH(QString, failing);
-        QFETCH(QString, instead);
-        if (!failing.isEmpty()) {
+        QFETCH(QJsonObject, row);
+        if (row.contains("failing")) {
             startServer();
-            m_server->failing = failing;
-            m_server->instead = instead;
+            m_server->failing = row["failing"].toString();
+            m_server->instead = row["instead"].toString();
         }
         LogCapture log;
         m_notifier->notify("<t>", kSender, "<x>");
@@ -198,6 +124,11 @@ private slots:
         QVERIFY(m_unavailable->wait(10000));
         QCOMPARE(m_unavailable->first(), QVariantList({"<t>", kSender, "<x>"}));
         QCOMPARE(log.count("DesktopNotifier"), 1);
+        // It has been shown otherwise by then.
+        if (row["late"].toBool()) {
+            m_server->answerLate();
+            QTRY_COMPARE(m_server->closed, QList<uint>{m_server->lastId});
+        }
 
         // The next message is tried afresh.
         if (!m_server)

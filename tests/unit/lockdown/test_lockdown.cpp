@@ -1,5 +1,5 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "libzentoxa.h"
-#include "testfiles.h"
 
 #include <QProcess>
 #include <QTemporaryDir>
@@ -79,11 +79,7 @@ private slots:
         const auto applyAll = [] { return run(QCoreApplication::applicationFilePath(), {kApplyAll}); };
         const QString missing = applyAll();
         QVERIFY2(missing.contains("schema is not installed") && missing.endsWith("\n0"), qPrintable(missing));
-        testfiles::write(directory.filePath("a.gschema.xml"), R"(<schemalist>
-            <schema id="com.vantor.zent.lockdown" path="/com/vantor/zent/lockdown/">
-              <key name="hotspot-enable" type="i"><range min="1" max="2"/><default>1</default></key>
-              <key name="recycle-bin-displayable" type="b"><default>true</default></key>
-            </schema></schemalist>)");
+        QVERIFY(QFile::copy(ZENT_TEST_DATA "/olderlockdown.gschema.xml", directory.filePath("a.gschema.xml")));
         QCOMPARE(run("glib-compile-schemas", {directory.path()}), QString("0"));
         const QString older = applyAll();
         QVERIFY2(older.contains("setting cannot be changed") && older.endsWith("\n1"), qPrintable(older));

@@ -1,40 +1,48 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "fixture.h"
+#include "notifymessages.h"
+#include "passwordreplies.h"
 #include "replies.h"
-
-#include <QtTest>
 
 class TestReplies : public QObject
 {
     Q_OBJECT
 
 private slots:
+    void userReplies_data() { fixture::addRows("userreplies.json"); }
     void userReplies()
     {
-        const auto user = [](const char* inner) {
-            return QByteArray(R"({"code": 0, "data": {"user": )") + inner + "}}";
-        };
-        const QMap<QByteArray, QString> cases = {
-            {user(R"({"gecos": "张三,3 层,,A1", "supplementtary_groups": [{"name": "研发"}, {"name": "x"}],
-                "id": 7, "client_name": "终端"})"),
-             "张三|A1|研发|终端|7"},
-            {user(R"({"gecos": "张三,"})"), "张三||||0"},
-            {user(R"({"gecos": null, "id": "7", "client_name": null})"), "||||0"},
-            {user(R"({"gecos": 5})"), "failed"},
-            {user(R"({"supplementtary_groups": ["a"]})"), "failed"},
-            {R"({"code": "0", "data": {"user": {}}})", "failed"},
-            {R"({"data": {"user": {}}})", "failed"},
-            {R"({"code": 0, "data": null})", "failed"},
-            {"", "not json"},
-            {"{\"code\": 0, \"x\": \"\xff\xfe\"}", "not json"},
-            {QByteArray(100000, '['), "not json"},
-        };
-        for (auto row = cases.begin(); row != cases.end(); ++row) {
-            const auto reply = zent::parseUserReply(row.key());
-            const zent::UserData& data = reply.value;
-            const QStringList texts = {data.gecosFirst, data.gecosLast, data.groupName, data.clientName};
-            QString text = texts.join('|') + '|' + QString::number(data.id);
-            if (!reply.isGood())
-                text = reply.state == zent::ReplyState::NotJson ? "not json" : "failed";
-            QCOMPARE(text, row.value());
+        QFETCH(QJsonObject, row);
+        const auto reply = zent::parseUserReply(row["body"].toString().toUtf8());
+        const zent::UserData& data = reply.value;
+        QJsonValue got = QJsonArray{data.gecosFirst, data.gecosLast, data.groupName, data.clientName, data.id};
+        if (!reply.isGood())
+            got = reply.state == zent::ReplyState::NotJson ? "not json" : "failed";
+        fixture::compare(got, row["got"]);
+    }
+    void unreadableReplies()
+    {
+        for (const QByteArray& body : {QByteArray("{\"code\": 0, \"x\": \"\xff\xfe\"}"), QByteArray(100000, '[')})
+            QCOMPARE(zent::parseUserReply(body).state, zent::ReplyState::NotJson);
+    }
+
+    void whatIsSentBackIsShortOrNothing()
+    {
+        for (const int length : {1000, 1001}) {
+            const QByteArray text(length, 'x');
+            const bool good = length == 1000;
+            for (const char* key : {"scene_name", "scene_code"}) {
+                const QByteArray scene = QByteArray("{\"") + key + "\": \"" + text + "\"}";
+                QCOMPARE(zent::parseSceneReply(R"({"code": 0, "message": [)" + scene + "]}").isGood(), good);
+            }
+            QString uuid;
+            for (const NotifyMessage& message : zent::parseMessageList("[{\"uuid\": \"" + text + "\"}]"))
+                uuid += message.uuid;
+            const QString token = zent::parseNotifyConfig("{\"token\": \"" + text + "\"}")->token;
+            const QString renewed =
+                zent::parsePasswordServerReply("{\"code\": 0, \"message\": \"" + text + "\"}")->token;
+            for (const QString& value : {uuid, token, renewed})
+                QCOMPARE(value, good ? QString(text) : QString());
         }
     }
 };

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "gates.h"
 #include "log.h"
 #include "paths.h"
@@ -6,6 +7,13 @@
 #include <QCoreApplication>
 #include <QRegularExpression>
 #include <QtTest>
+
+#include <cstdlib>
+#include <cstring>
+#include <ctime>
+#include <sys/resource.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 class TestStartup : public QObject
 {
@@ -35,6 +43,24 @@ private slots:
         qputenv("PATH", path);
     }
 
+    void waitForIdSleeps()
+    {
+        // It closes its output well before its end.
+        testfiles::write("/tmp/bin/id", "#!/bin/sh\necho zent; exec >&-; sleep 1\n");
+        QFile::setPermissions("/tmp/bin/id", QFile::ReadOwner | QFile::ExeOwner);
+        const QByteArray path = qgetenv("PATH");
+        qputenv("PATH", "/tmp/bin:" + path);
+        const std::clock_t processor = std::clock();
+        rusage before{};
+        rusage after{};
+        getrusage(RUSAGE_THREAD, &before);
+        QVERIFY(isLDAPUser());
+        getrusage(RUSAGE_THREAD, &after);
+        qputenv("PATH", path);
+        QVERIFY(after.ru_nvcsw - before.ru_nvcsw < 50);
+        QVERIFY(std::clock() - processor < CLOCKS_PER_SEC / 3);
+    }
+
     void minorVersion()
     {
         testfiles::write(zent::kOsVersionPath, "MinorVersion=1\nMinorVersion=1021\nX=1\n");
@@ -43,6 +69,27 @@ private slots:
         QCOMPARE(getMiniVersion(), -1);
         testfiles::remove(zent::kOsVersionPath);
         QCOMPARE(getMiniVersion(), 1000);
+    }
+
+    void identityLivesAsLongAsTheLog()
+    {
+        // Registered first, it runs last, when the memory of what was destroyed has been used again.
+        const pid_t child = fork();
+        if (child == 0) {
+            std::atexit([] {
+                for (std::size_t size = 24; size < 200; size += 8) {
+                    for (int i = 0; i < 1000; ++i)
+                        std::memset(std::malloc(size), 'x', size);
+                }
+                qWarning("at the end");
+            });
+            zent::uOpenlog(zent::LEVEL_DEBUG);
+            std::exit(0);
+        }
+        waitpid(child, nullptr, 0);
+        const QByteArray identity = " test_startup[" + QByteArray::number(child) + "]: ";
+        QTRY_VERIFY(testfiles::read(m_room + "/syslog").contains("at the end"));
+        QVERIFY(testfiles::read(m_room + "/syslog").contains(identity));
     }
 
     void syslogRecords()

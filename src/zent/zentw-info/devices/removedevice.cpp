@@ -1,9 +1,11 @@
-#include "removedevice.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "devices/removedevice.h"
+
+#include "system/childprocess.h"
 
 #include <QDebug>
 #include <QDir>
 #include <QFileInfo>
-#include <QProcess>
 #include <QStringList>
 
 #include <algorithm>
@@ -30,20 +32,32 @@ QString mountNameForm(QString product)
         .replace(QStringLiteral(":"), QStringLiteral("%3A"));
 }
 
-void unmount(const QString& path)
+/// False when the time is up.
+bool unmount(const QString& path, const QDeadlineTimer& limit)
 {
     qDebug() << "Driver: " << path;
     try {
-        QProcess::execute(QStringLiteral("gio"), {QStringLiteral("mount"), QStringLiteral("-u"), path});
+        const int status =
+            zent::execute(QStringLiteral("gio"), {QStringLiteral("mount"), QStringLiteral("-u"), path}, limit);
+        if (status == zent::kTimeIsUp)
+            return false;
+        if (status != 0)
+            qWarning() << path << " unmount failed:" << status;
     } catch (const std::exception& reason) {
         qWarning() << path << " unmount failed:" << reason.what();
     }
+    return true;
 }
 
 } // namespace
 
 RemoveDevice::RemoveDevice(QObject* parent) : QObject(parent)
 {
+}
+
+void RemoveDevice::setTimeLimit(int ms)
+{
+    m_timeLimitMs = ms;
 }
 
 int RemoveDevice::find(const QString& path, QVector<QString>& directories)
@@ -68,11 +82,9 @@ int RemoveDevice::find(const QString& path, QVector<QString>& directories)
 void RemoveDevice::removeDevice(const QString& manufacturer, const QString& product, const QString& serial,
                                 const QString& uid)
 {
-    qDebug() << "removeDevice"
-             << "------------i";
+    qDebug() << "removeDevice ------------i";
     if (!isUserId(uid)) {
-        qWarning() << "removeDevice"
-                   << "not a user id:" << uid;
+        qWarning() << "removeDevice not a user id:" << uid;
         return;
     }
     QVector<QString> directories;
@@ -80,8 +92,8 @@ void RemoveDevice::removeDevice(const QString& manufacturer, const QString& prod
     if (directories.isEmpty())
         return;
 
-    qDebug() << "removeDevice"
-             << "manufacturer:" << manufacturer << ":product:" << product << ":serial:" << serial << ":uid:" << uid;
+    qDebug() << "removeDevice manufacturer:" << manufacturer << ":product:" << product << ":serial:" << serial
+             << ":uid:" << uid;
     const QString productInNames = mountNameForm(product);
     qDebug() << "manufacturer: " << manufacturer << ", product: " << productInNames << ", serial: " << serial;
 
@@ -93,6 +105,11 @@ void RemoveDevice::removeDevice(const QString& manufacturer, const QString& prod
         if (serialIndex >= 0)
             matches.append(path);
     }
-    for (const QString& path : qAsConst(matches))
-        unmount(path);
+    const QDeadlineTimer limit(m_timeLimitMs);
+    for (int i = 0; i < matches.size(); ++i) {
+        if (unmount(matches.at(i), limit))
+            continue;
+        qWarning() << matches.at(i) << " unmount failed: time is up, skipped as well:" << matches.size() - i - 1;
+        break;
+    }
 }

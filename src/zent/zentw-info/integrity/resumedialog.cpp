@@ -1,6 +1,9 @@
-#include "resumedialog.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "integrity/resumedialog.h"
 
-#include "thirdscript.h"
+#include "displaytext.h"
+#include "frontend/frontend.h"
+#include "screen/showwindow.h"
 #include "toolkitframe.h"
 #include "toolkitlabel.h"
 #include "toolkitsuggestbutton.h"
@@ -10,7 +13,6 @@
 #include <QDesktopServices>
 #include <QHBoxLayout>
 #include <QIcon>
-#include <QProcess>
 #include <QTimer>
 #include <QUrl>
 #include <QVBoxLayout>
@@ -19,17 +21,6 @@ namespace
 {
 
 constexpr int kVerificationPeriodMs = 300000;
-
-QStringList verificationArguments()
-{
-    return {zent::kFrontEndPath,
-            zent::kFrontEndCommandOption,
-            QStringLiteral("policy"),
-            QStringLiteral("--scenceinfo"),
-            QStringLiteral("emptyscenecode"),
-            zent::kThirdScriptArgumentsOption,
-            QStringLiteral("RUNFULLZONEVARIFY")};
-}
 
 } // namespace
 
@@ -77,8 +68,9 @@ void resumeDialog::createInterface()
     m_timer->setObjectName(QStringLiteral("terminalVarifyTimer"));
 }
 
-void resumeDialog::setRepairTitle(const QString& text)
+void resumeDialog::setRepairTitle(const QString& whole)
 {
+    const QString text = zent::display::cut(whole);
     m_message->setText(text);
     setAccessibleDescription(text);
     // Two lines fit; the tool tip shows what a longer report has beyond them.
@@ -93,8 +85,7 @@ void resumeDialog::setIpPort(const QString& host, const QString& port)
 
 void resumeDialog::Notify(const QString& errmsg, const QString& url)
 {
-    qDebug() << "fullzonevarify dbus called"
-             << "Notify" << errmsg << url;
+    qDebug() << "fullzonevarify dbus called Notify" << errmsg << url;
     if (errmsg == QLatin1String("success")) {
         m_passed = 1;
         setRepairTitle(QString());
@@ -107,7 +98,7 @@ void resumeDialog::Notify(const QString& errmsg, const QString& url)
     m_repairUrl = QStringLiteral("http://") + m_address + QStringLiteral("/api") + url;
     qDebug() << "fix page url :" << m_repairUrl << "errmsg :" << errmsg << "ternimal integrity varify suceeded!";
     setRepairTitle(errmsg);
-    show();
+    zent::showActive(*this);
 }
 
 void resumeDialog::switchVerification()
@@ -124,22 +115,16 @@ void resumeDialog::switchVerification()
 
 void resumeDialog::getDeviceIntegralityVarifyScript()
 {
-    auto* process = new QProcess(this);
-    connect(process, QOverload<int, QProcess::ExitStatus>::of(&QProcess::finished), process, &QObject::deleteLater);
-    connect(process, &QProcess::errorOccurred, process, [process](QProcess::ProcessError error) {
-        if (error == QProcess::FailedToStart)
-            process->deleteLater();
-    });
-    const QStringList arguments = verificationArguments();
-    for (const QString& word : arguments)
+    const QStringList command = zent::frontend::verificationCommand();
+    for (const QString& word : command)
         qDebug() << "....closeguardApp.bash:" << word;
-    process->start(zent::kFrontEndInterpreter, arguments, QIODevice::ReadWrite);
+    // It goes on where it is when the client ends, and nobody reads what it prints.
+    zent::frontend::startSilently(command);
 }
 
 void resumeDialog::confirmCliked()
 {
-    qDebug() << "confirmCliked"
-             << "fix page url :" << m_repairUrl;
+    qDebug() << "confirmCliked fix page url :" << m_repairUrl;
     QDesktopServices::openUrl(QUrl(m_repairUrl));
 }
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include "toolkitdialog.h"
@@ -34,7 +35,7 @@ public slots:
     void confirmCliked();
     void hideWindow();
     /// "success" closes the dialog. With `url` "true" or "false", `errmsg` "open" starts the periodic verification and
-    /// anything else stops it; any other `url` is the repair page's path and `errmsg` the failure to show.
+    /// anything else stops it. Any other `url` is the repair page's path and `errmsg` the failure to show.
     Q_SCRIPTABLE void Notify(const QString& errmsg, const QString& url);
 
 protected:

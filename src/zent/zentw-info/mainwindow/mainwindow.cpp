@@ -1,34 +1,34 @@
-#include "mainwindow.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "mainwindow/mainwindow.h"
 
-#include "closeguarddialog.h"
 #include "dbusnames.h"
-#include "httprequest.h"
-#include "idcommand.h"
-#include "infowidget.h"
-#include "legacyqt.h"
-#include "loginname.h"
-#include "modifydialog.h"
+#include "messages/noticedialog.h"
 #include "networkdaemonproxy.h"
-#include "noticedialog.h"
-#include "notification.h"
-#include "replies.h"
-#include "screens.h"
+#include "panel/infowidget.h"
+#include "password/modifydialog.h"
+#include "paths.h"
+#include "release/closeguarddialog.h"
+#include "replies/replies.h"
+#include "screen/screens.h"
+#include "screen/showwindow.h"
+#include "system/childprocess.h"
+#include "terminal/noconfig.h"
+#include "toolkitdialog.h"
 #include "toolkittitlebar.h"
-#include "trayhost.h"
 #include "windowmanagerhelper.h"
 
 #include <QAbstractButton>
+#include <QCheckBox>
 #include <QCloseEvent>
 #include <QDebug>
-#include <QNetworkAccessManager>
-#include <QNetworkReply>
-#include <QTime>
+#include <QFile>
+#include <QSignalBlocker>
+#include <QTextCodec>
 #include <QTimer>
 #include <QVBoxLayout>
 
 #include <cstdio>
 #include <cstdlib>
-#include <unistd.h>
 
 /// The images live in a static library, whose initialiser the linker would otherwise drop. Outside any namespace, as
 /// the initialiser is.
@@ -40,41 +40,43 @@ static void initResources()
 namespace
 {
 
+/// From this version on a click on the icon toggles the message window.
+constexpr int kMessageWindowVersion = 1030;
+
 constexpr int kWindowWidth = 300;
 constexpr int kTitlebarHeight = 50;
 constexpr int kOpaque = 255;
-constexpr int kUserInfoIntervalMs = 2000;
-constexpr int kAreaInfoIntervalMs = 3000;
 constexpr int kPlacementIntervalMs = 1000;
-constexpr int kPolicyEarliestMs = 30000;
-constexpr int kPolicyLatestMs = 60000;
+
+const char* textOf(bool value)
+{
+    return value ? "true" : "false";
+}
 
 } // namespace
 
+int MainWindow::unreadMessageCount = 0;
+
 MainWindow::MainWindow(QWidget* parent, int osVersion)
-    : ToolkitBlurFrame(parent),
+    : ToolkitBlurFrame(parent), scenes(terminal, account.name(), this),
+      unread(account.name(), unreadMessageCount, this), tray(osVersion, productName(), this),
       networkProxy(new NetworkDaemonProxy(zent::dbus::kNetworkService, zent::dbus::kNetworkPath,
                                           QDBusConnection::sessionBus(), this)),
-      osVersion(osVersion), startedId(std::make_unique<IdCommand>())
+      osVersion(osVersion)
 {
     initResources();
-    policyTimer = std::make_unique<QTimer>();
-    connect(policyTimer.get(), &QTimer::timeout, this, &MainWindow::startPolicy);
-    policyTimer->start(generateRandnum(kPolicyLatestMs, kPolicyEarliestMs));
     getUserName();
     createNoticeDialog();
     getConfig();
     createPanel();
-    // An icon made before the desktop's tray host has registered would never appear there, so until then it waits.
-    if (zent::trayhost::canShowIconNow())
-        showSystemTrayIcon();
+    connectPieces();
+    tray.showWhenHosted();
     initPlatformMessage();
-    createManagers();
-    connectManagementClient();
-    startInfoTimers();
+    scenes.start();
+    account.start();
     onNetinfoClicked();
     onLogininfoClicked();
-    renewCurrentScene(zent::kStartScene);
+    scenes.renewCurrentScene(zent::kStartScene);
     posTimer = std::make_unique<QTimer>();
     connect(posTimer.get(), &QTimer::timeout, this, &MainWindow::resetUIPos);
     posTimer->start(kPlacementIntervalMs);
@@ -94,24 +96,22 @@ MainWindow::~MainWindow()
     remove(messageWindow);
     remove(guardDialog);
     remove(networkProxy);
-    remove(userManager);
-    remove(areaInfoTimer);
-    remove(userInfoTimer);
 }
 
 void MainWindow::createPanel()
 {
     setFixedWidth(kWindowWidth);
     setAccessibleName(productName());
-    const bool showRelease = isScenceUser() || isAdminUser();
+    const bool showRelease = account.isScenceUser() || account.isAdminUser();
 
-    titlebar = new ToolkitTitlebar(this);
+    auto* titlebar = new ToolkitTitlebar(this);
     titlebar->setMenuVisible(false);
     titlebar->setFixedHeight(kTitlebarHeight);
     titlebar->setBackgroundTransparent(true);
     QPalette transparent = titlebar->palette();
     transparent.setColor(QPalette::Window, Qt::transparent);
     titlebar->setPalette(transparent);
+    connect(titlebar, &ToolkitTitlebar::windowDragged, this, [this] { movedByUser = true; });
     setWindowFlag(Qt::WindowMinimizeButtonHint, false);
     setWindowFlag(Qt::WindowMaximizeButtonHint, false);
 
@@ -132,7 +132,9 @@ void MainWindow::connectPanel()
     connect(infoWidget, SIGNAL(modifyPasswordClicked()), this, SLOT(onModifypasswordClicked()));
     connect(infoWidget, SIGNAL(removeRegionClicked()), this, SLOT(onCloseguardClicked()));
     connect(infoWidget, SIGNAL(shutdownClicked()), this, SLOT(onShutdownClicked()));
-    connect(titlebar, &ToolkitTitlebar::windowDragged, this, [this] { movedByUser = true; });
+    // The panel then goes to its corner by itself.
+    connect(infoWidget->findChild<QCheckBox*>(QStringLiteral("onTop")), &QCheckBox::stateChanged, this,
+            [this] { movedByUser = false; });
     // Every change of page refreshes the page.
     const auto loginButton = infoWidget->findChild<QAbstractButton*>(QStringLiteral("LoginInfo"));
     const auto netButton = infoWidget->findChild<QAbstractButton*>(QStringLiteral("NetInfo"));
@@ -140,9 +142,46 @@ void MainWindow::connectPanel()
     connect(netButton, &QAbstractButton::clicked, this, &MainWindow::onNetinfoClicked);
 }
 
+void MainWindow::connectPieces()
+{
+    connect(&account, &Account::userChanged, this, &MainWindow::onLogininfoClicked);
+    connect(&account, &Account::organisationChanged, this, [this] {
+        onLogininfoClicked();
+        onNetinfoClicked();
+    });
+    connect(&account, &Account::areaKnown, &scenes, &Scenes::getAllUserEnvironment);
+    connect(&account, &Account::areaFailed, this, [this] { setSceneBox(false); });
+
+    connect(&scenes, &Scenes::choiceChanged, this, &MainWindow::setSceneBox);
+    connect(&scenes, &Scenes::namesAdded, infoWidget, &InfoWidget::setSceneBoxData);
+    connect(&scenes, &Scenes::selected, this, [this](int index) {
+        // Going back is not a choice either: it must not reach the user's scene file.
+        const QSignalBlocker blocker(infoWidget);
+        infoWidget->setCurrentScene(index);
+    });
+    // Filling the box is not a choice.
+    connect(infoWidget, &InfoWidget::environmentChanegd, this, [this] {
+        if (scenes.areOffered())
+            switchUserEvn();
+    });
+
+    connect(&unread, &UnreadPoll::newMessage, this, &MainWindow::newMessage);
+    connect(&unread, &UnreadPoll::textChanged, infoWidget, &InfoWidget::setMessageButtonText);
+    connect(this, &MainWindow::startgetMeInfo, &account, &Account::getusrInfo);
+
+    connect(&tray, &TrayIcon::activated, this, &MainWindow::onActivatedSysTrayIcon);
+    connect(&tray, &TrayIcon::balloonClicked, this, &MainWindow::openNotice);
+}
+
+void MainWindow::setSceneBox(bool visible)
+{
+    infoWidget->setSceneBox(visible);
+    fitToPanel();
+}
+
 void MainWindow::fitToPanel()
 {
-    const int height = titlebar->height() + infoWidget->height();
+    const int height = kTitlebarHeight + infoWidget->height();
     if (height == this->height())
         return;
     setFixedHeight(height);
@@ -161,46 +200,81 @@ void MainWindow::returnToScreen()
     zent::screens::placeBottomRight(*this, zent::screens::availableGeometry());
 }
 
-void MainWindow::createNoticeDialog()
+void MainWindow::getUserName()
 {
-    if (!QNotification::qInstance)
-        QNotification::qInstance = new QNotification;
-    noticeDialog = new NoticeDialog(userName, this);
-    noticeDialog->setWindowFlags(noticeDialog->windowFlags() | Qt::WindowStaysOnTopHint);
+    if (account.getUserName())
+        scenes.startWithFirst();
+    else
+        closewindow();
 }
 
-void MainWindow::createManagers()
+bool MainWindow::whetherJoinGuard()
 {
-    userManager = new QNetworkAccessManager(this);
-    areaManager = new QNetworkAccessManager(this);
-    sceneManager = new QNetworkAccessManager(this);
-    connect(userManager, &QNetworkAccessManager::finished, this, &MainWindow::analysejson);
-    connect(areaManager, &QNetworkAccessManager::finished, this, &MainWindow::rcvAreainfoData);
-    connect(sceneManager, &QNetworkAccessManager::finished, this, &MainWindow::rcvEvninfoData);
+    return !zent::Terminal::missingInfoFile();
 }
 
-void MainWindow::connectManagementClient()
+void MainWindow::getConfig()
 {
-    const HttpRequest* client = HttpRequest::GetInstance();
-    connect(client, &HttpRequest::sigUserInfo, this, &MainWindow::onUserInfo);
-    connect(client, &HttpRequest::sigCompanyName, this, &MainWindow::onCompanyName);
+    if (const auto missing = zent::Terminal::missingInfoFile()) {
+        ToolkitDialog::tell(nullptr, zent::noconfig::text(zent::kUserinfoPath, missing->text), zent::noconfig::kTitle,
+                            ToolkitDialog::CriticalBox);
+        std::_Exit(-1);
+    }
+    terminal.read();
 }
 
-void MainWindow::startInfoTimers()
+void MainWindow::switchUserEvn()
 {
-    userInfoTimer = new QTimer;
-    connect(userInfoTimer, &QTimer::timeout, this, &MainWindow::getusrInfo);
-    userInfoTimer->start(kUserInfoIntervalMs);
-    areaInfoTimer = new QTimer;
-    connect(areaInfoTimer, &QTimer::timeout, this, &MainWindow::getAreaInfo);
-    areaInfoTimer->start(kAreaInfoIntervalMs);
+    scenes.switchUserEvn(infoWidget->getCurrentScene());
 }
 
 void MainWindow::closeEvent(QCloseEvent*)
 {
-    qDebug() << "closeEvent"
-             << "--------";
+    qDebug() << "closeEvent --------";
     onHideClicked();
+}
+
+void MainWindow::onActivatedSysTrayIcon(QSystemTrayIcon::ActivationReason reason)
+{
+    qDebug() << "onActivatedSysTrayIcon reason :" << static_cast<int>(reason);
+    switch (reason) {
+    case QSystemTrayIcon::Context:
+        // The next left click shows the panel, whether it is visible or not.
+        winstatus = 1;
+        break;
+    case QSystemTrayIcon::Trigger:
+        qDebug() << "tarn ishidden : " << textOf(isHidden());
+        qDebug() << "tarn this->openMessagetWindow : " << textOf(openMessagetWindow);
+        dealSysTrayEvent();
+        break;
+    case QSystemTrayIcon::DoubleClick:
+    case QSystemTrayIcon::MiddleClick:
+    case QSystemTrayIcon::Unknown:
+        break;
+    }
+}
+
+void MainWindow::dealSysTrayEvent()
+{
+    if (osVersion >= kMessageWindowVersion) {
+        const bool shown = !openMessagetWindow || (messageWindow && messageWindow->isHidden());
+        if (!openMessagetWindow)
+            qDebug() << "tarn this->openMessagetWindow @@@@: " << textOf(openMessagetWindow);
+        if (messageWindow)
+            messageWindow->setVisible(shown);
+        return;
+    }
+    qDebug() << "winstatus : " << winstatus;
+    if (winstatus == 0) {
+        onHideClicked();
+        return;
+    }
+    if (!movedByUser)
+        zent::screens::keepInWorkArea(*this);
+    zent::showActive(*this);
+    repaint();
+    winstatus = 0;
+    setFocus(Qt::OtherFocusReason);
 }
 
 void MainWindow::onHideClicked()
@@ -211,19 +285,18 @@ void MainWindow::onHideClicked()
 
 void MainWindow::onShutdownClicked()
 {
-    zent::legacy::startDetached(QStringLiteral("oxa-shutdown"));
+    zent::startDetached(QStringLiteral("oxa-shutdown"));
 }
 
 void MainWindow::shutdown()
 {
-    if (sysTrayIcon)
-        sysTrayIcon->setVisible(false);
+    tray.hide();
     close();
 }
 
 void MainWindow::closewindow()
 {
-    zent::legacy::startDetached(QStringLiteral("killall -9  tarn"));
+    zent::startDetached(QStringLiteral("killall -9  tarn"));
 }
 
 void MainWindow::loadSelf()
@@ -231,55 +304,20 @@ void MainWindow::loadSelf()
     std::_Exit(0);
 }
 
-void MainWindow::onOntopStatechanged()
-{
-    // The panel changes the flags itself.
-}
-
 void MainWindow::resetUIPos()
 {
-    qDebug() << "resetUIPos"
-             << ":---------";
+    qDebug() << "resetUIPos :---------";
     const QRect full = zent::screens::fullGeometry();
-    const QRect available = zent::screens::primaryAvailableGeometry();
-    qDebug() << "resetUIPos"
-             << ":---------" << available.height() << ":" << full.height();
+    const QRect available = zent::screens::availableGeometry();
+    qDebug() << "resetUIPos :---------" << available.height() << ":" << full.height();
     if (full.height() > available.height()) {
-        qDebug() << "resetUIPos"
-                 << ":---@@@@";
+        qDebug() << "resetUIPos :---@@@@";
         posTimer->stop();
+        movedByUser = false;
         zent::screens::placeBottomRight(*this, available);
     }
     if (!isVisible())
         posTimer->stop();
-}
-
-int MainWindow::generateRandnum(const int& a, const int& b)
-{
-    zent::legacy::seedRandom(static_cast<unsigned int>(QTime(0, 0).secsTo(QTime::currentTime())));
-    const int r = zent::legacy::random();
-    return a == b ? b : r % (a - b) + b;
-}
-
-QString MainWindow::getHostName()
-{
-    char name[1024] = {};
-    gethostname(name, sizeof name - 1);
-    return QString::fromLatin1(name);
-}
-
-void MainWindow::getUserName()
-{
-    const QString name = sessionLoginName().remove(QLatin1Char('@'));
-    qDebug() << "getusername:" << name;
-    if (isLdapUser()) {
-        currentSceneIndex = 0;
-        userName = name;
-        qDebug() << "userName:" << userName;
-    } else {
-        closewindow();
-    }
-    qDebug() << "username got :" << userName;
 }
 
 int MainWindow::system(const QString& command)
@@ -293,10 +331,24 @@ int MainWindow::system(const QString& command)
     if (!pipe)
         return kNotOpened;
     char piece[128];
+    // One for the whole output: a character that a piece's end cuts appears in the next piece.
+    const std::unique_ptr<QTextDecoder> decoder(QTextCodec::codecForName("UTF-8")->makeDecoder());
     while (fgets(piece, sizeof piece, pipe)) {
-        const QString line = QString::fromUtf8(piece);
+        const QString line = decoder->toUnicode(piece);
         qDebug() << "system" << line;
         commandOutput.append(line);
     }
+    if (decoder->needsMoreData())
+        commandOutput.last() += QChar(QChar::ReplacementCharacter);
     return pclose(pipe) == -1 ? kNotClosed : 0;
+}
+
+QString MainWindow::readScriptsFile(const QString& path)
+{
+    QFile file(path);
+    if (!file.open(QIODevice::ReadOnly)) {
+        qDebug() << "readScriptsFile read file path failed! " << path;
+        return QString();
+    }
+    return QString::fromUtf8(file.readAll());
 }

@@ -1,7 +1,11 @@
-#include "noticedialog.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "messages/noticedialog.h"
 
-#include "notification.h"
-#include "screens.h"
+#include "displaytext.h"
+#include "focusring.h"
+#include "messages/notification.h"
+#include "screen/screens.h"
+#include "screen/showwindow.h"
 #include "toolkitblurframe.h"
 #include "toolkitlabel.h"
 #include "toolkitsuggestbutton.h"
@@ -52,12 +56,9 @@ protected:
     void paintEvent(QPaintEvent* event) override
     {
         QPlainTextEdit::paintEvent(event);
-        if (!hasFocus() || !window()->testAttribute(Qt::WA_KeyboardFocusChange))
-            return;
         QPainter painter(viewport());
         painter.setRenderHint(QPainter::Antialiasing);
-        painter.setPen(QPen(palette().color(QPalette::Highlight), 1));
-        painter.drawRoundedRect(QRectF(viewport()->rect()).adjusted(0.5, 0.5, -0.5, -0.5), 4, 4);
+        focusring::paint(painter, this, viewport()->rect(), 4);
     }
 };
 
@@ -165,7 +166,8 @@ QLayout* NoticeDialog::createButtons()
     auto* layout = new QHBoxLayout;
     layout->setSpacing(0);
     for (ToolkitPushButton* button : {m_firstButton, static_cast<ToolkitPushButton*>(m_nextButton)}) {
-        // A whole palette: a widget with a style sheet takes what is not its own from the application's.
+        // A complete palette: a widget with a style sheet takes the colours that it lacks from the application's
+        // palette.
         QPalette colors = ThemeHelper::palette(ThemeHelper::LightType);
         colors.setColor(QPalette::ButtonText, Qt::white);
         button->setPalette(colors);
@@ -181,10 +183,17 @@ QLayout* NoticeDialog::createButtons()
 void NoticeDialog::showNotice()
 {
     qDebug() << "showNotice";
+    // The request is still to come, and each wait inside another takes a piece of the stack.
+    if (m_waits)
+        return;
+    m_waits = true;
     const QPointer<NoticeDialog> self = this;
     QNotification::msleep(kRefreshDelayMs);
     // Events were let through: the dialog or the service may be gone.
-    if (!self || !QNotification::qInstance)
+    if (!self)
+        return;
+    m_waits = false;
+    if (!QNotification::qInstance)
         return;
     QNotification::qInstance->getNotifyMessageList(m_userName, true, 1, 1,
                                                    [self](bool ok, const NotifyMessageResponse& response) {
@@ -200,6 +209,7 @@ void NoticeDialog::onMessageList(bool ok, const NotifyMessageResponse& response)
         return;
     m_total = response.total;
     qDebug() << "noticeDialog::getNotifyMessageList()-02:" << m_total;
+    m_offersRead = m_total < 2 && !response.messages.isEmpty();
     if (response.messages.isEmpty()) {
         m_firstButton->show();
         m_nextButton->hide();
@@ -213,7 +223,7 @@ void NoticeDialog::onMessageList(bool ok, const NotifyMessageResponse& response)
     // would close the dialog.
     if (!isVisible() || !m_contentFrame->isAncestorOf(focusWidget()))
         m_contentView->setFocus();
-    show();
+    zent::showActive(*this);
     m_nextButton->setEnabled(true);
 }
 
@@ -221,21 +231,20 @@ void NoticeDialog::showMessage(const NotifyMessage& message)
 {
     createTextViews();
     setTitle(QStringLiteral("消息详情"));
-    m_titleView->setPlainText(message.title);
-    m_senderLabel->setText(QStringLiteral("发送人: ") + message.send_uid);
+    m_titleView->setPlainText(zent::display::cut(message.title));
+    m_senderLabel->setText(QStringLiteral("发送人: ") + zent::display::cut(message.send_uid));
     m_timeLabel->setText(QNotification::formatTime(message.created_at, true));
-    m_contentView->setPlainText(message.content);
+    m_contentView->setPlainText(zent::display::cut(message.content, zent::display::kContentLength));
     m_currentUuid = message.uuid;
 }
 
 void NoticeDialog::updateButtons()
 {
-    const bool last = m_total < 2;
-    m_firstButton->setFixedSize(last ? kWideButtonSize : kButtonSize);
-    m_firstButton->setText(last ? QStringLiteral("已读") : closeText());
+    m_firstButton->setFixedSize(m_offersRead ? kWideButtonSize : kButtonSize);
+    m_firstButton->setText(m_offersRead ? QStringLiteral("已读") : closeText());
     m_firstButton->show();
-    m_nextButton->setVisible(!last);
-    if (!last)
+    m_nextButton->setVisible(!m_offersRead);
+    if (!m_offersRead)
         m_nextButton->setText(QStringLiteral("下一条(%1)").arg(QNotification::formatUnReadNumber(m_total)));
 }
 

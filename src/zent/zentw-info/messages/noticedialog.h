@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include "toolkitdialog.h"
@@ -25,8 +26,9 @@ public:
     /// @param userName the uid whose messages are asked for
     NoticeDialog(const QString& userName, QWidget* parent);
 
-    /// Waits a second while events keep flowing, asks the service for the newest unread message, and shows it when
-    /// the answer comes. An answer without a message leaves the visibility as it is, a failed one everything.
+    /// Waits a second while events are handled; a call during the wait joins it. Then asks the service for the newest
+    /// unread message, and shows it when the answer comes. An answer without a message leaves the visibility as it is,
+    /// a failed one everything.
     void showNotice();
 
     /// Reads "已读" with one unread message, else "关闭".
@@ -34,8 +36,8 @@ public:
     /// Disabled by the opener while a message is being marked read; a refresh enables it again.
     QPushButton* nextButton() const;
 
-    /// The number of unread messages in the last answer.
-    int total() const { return m_total; }
+    /// Whether the first button offers to mark the message on show as read, as opposed to closing the dialog.
+    bool offersRead() const { return m_offersRead; }
     /// The message on show, empty before the first one.
     QString currentUuid() const { return m_currentUuid; }
 
@@ -61,6 +63,9 @@ private:
     ToolkitPushButton* m_firstButton = nullptr;
     ToolkitSuggestButton* m_nextButton = nullptr;
     int m_total = 0;
+    bool m_offersRead = false;
+    /// Before a refresh's request.
+    bool m_waits = false;
     QString m_currentUuid;
     QString m_userName;
 };

@@ -1,19 +1,19 @@
-#include "notification.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "messages/notification.h"
 
 #include "gethttpheader.h"
 #include "paths.h"
 #include "replywatch.h"
+#include "terminalinfo.h"
 #include "urlquery.h"
 
 #include <QDateTime>
 #include <QDebug>
 #include <QEventLoop>
-#include <QFile>
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QNetworkAccessManager>
 #include <QNetworkReply>
-#include <QSslCertificate>
 #include <QTimer>
 #include <QUrlQuery>
 
@@ -24,12 +24,11 @@ QNotification* QNotification::qInstance = nullptr;
 namespace
 {
 
-constexpr int kTransferTimeoutMs = 30000;
 constexpr int kLargestShownNumber = 99;
 constexpr int kWaitSliceMs = 100;
 
 const QString kUnreadParameter = QStringLiteral("is_not_read");
-/// Misspelt by the service, too; its value only makes each URL unique.
+/// The agreed spelling. Its value makes each URL unique.
 const QString kTimeParameter = QStringLiteral("timestaps");
 
 QString timeStamp()
@@ -37,31 +36,17 @@ QString timeStamp()
     return QString::number(QDateTime::currentSecsSinceEpoch());
 }
 
-/// Trusts the platform's own authority besides the system's.
-QSslConfiguration platformSsl()
-{
-    QSslConfiguration ssl = QSslConfiguration::defaultConfiguration();
-    const QList<QSslCertificate> authorities = QSslCertificate::fromPath(zent::kServerCertPath);
-    // Added, not set: a configuration whose authorities were set holds all of the system's in memory, otherwise the one
-    // needed is looked up when it is needed.
-    ssl.addCaCertificates(authorities);
-    return ssl;
-}
-
 } // namespace
 
-QNotification::QNotification(QObject* parent) : QObject(parent)
+QNotification::QNotification(QObject* parent)
+    : QObject(parent), m_listManager(new QNetworkAccessManager(this)), m_readManager(new QNetworkAccessManager(this)),
+      m_readAllManager(new QNetworkAccessManager(this))
 {
     loadCfg();
-}
-
-QNetworkAccessManager* QNotification::manager(QNetworkAccessManager*& member, const char* finishedSlot)
-{
-    if (!member) {
-        member = new QNetworkAccessManager(this);
-        connect(member, SIGNAL(finished(QNetworkReply*)), this, finishedSlot);
-    }
-    return member;
+    connect(m_listManager, SIGNAL(finished(QNetworkReply*)), this, SLOT(messageListRequestFinished(QNetworkReply*)));
+    connect(m_readManager, SIGNAL(finished(QNetworkReply*)), this, SLOT(messageReadRequestFinished(QNetworkReply*)));
+    connect(m_readAllManager, SIGNAL(finished(QNetworkReply*)), this,
+            SLOT(messageReadAllRequestFinished(QNetworkReply*)));
 }
 
 int QNotification::loadCfg()
@@ -71,14 +56,14 @@ int QNotification::loadCfg()
     constexpr int kNotJson = -3;
     int result = 0;
     zent::NotifyConfig config;
-    QFile file(zent::kUserinfoPath);
-    if (!file.exists()) {
+    const zent::base::FileReading info = zent::base::readTerminalInfo();
+    if (!info.exists) {
         qWarning() << "open config.json file failed." << zent::kUserinfoPath;
         result = kNoFile;
-    } else if (!file.open(QIODevice::ReadOnly)) {
+    } else if (!info.opened) {
         qWarning() << "read config.json file failed.";
         result = kNotReadable;
-    } else if (const auto parsed = zent::parseNotifyConfig(file.readAll())) {
+    } else if (const auto parsed = zent::parseNotifyConfig(info.content)) {
         config = *parsed;
     } else {
         qWarning() << "parse config.json file failed.";
@@ -93,18 +78,33 @@ int QNotification::loadCfg()
 
 QNetworkRequest QNotification::makeRequest(const QUrl& url, const char* caller)
 {
-    QNetworkRequest request(url);
-    request.setTransferTimeout(kTransferTimeoutMs);
+    QNetworkRequest request = zent::http::makeRequest(url);
     const GetHttpHeader* version = GetHttpHeader::GetInstance();
     qDebug() << caller << " strVersion:" << version->header();
     version->apply(request);
     request.setRawHeader("X-XSRF-TOKEN", m_token.toUtf8());
     if (url.scheme() == QLatin1String("https")) {
-        if (!m_ssl)
-            m_ssl = platformSsl();
+        followAuthority();
         request.setSslConfiguration(*m_ssl);
     }
     return request;
+}
+
+void QNotification::followAuthority()
+{
+    const QByteArray now = zent::http::fingerprint({zent::kServerCertPath, {}, {}});
+    if (!m_ssl || now != m_authority) {
+        m_oldConnections = m_ssl.has_value();
+        m_authority = now;
+        m_ssl = zent::http::tlsBesideSystem(zent::kServerCertPath);
+    }
+    if (!m_oldConnections)
+        return;
+    m_oldConnections = false;
+    for (QNetworkAccessManager* manager : {m_listManager, m_readManager, m_readAllManager}) {
+        if (manager && !zent::dropConnections(manager))
+            m_oldConnections = true;
+    }
 }
 
 int QNotification::getNotifyMessageList(const NotifyMessageOption& option, list_message_callback callback)
@@ -119,8 +119,8 @@ int QNotification::getNotifyMessageList(const NotifyMessageOption& option, list_
                           {kTimeParameter, timeStamp()}});
     qDebug() << "Rquest[GET]: " << url;
     const QNetworkRequest request = makeRequest(url, "getNotifyMessageList");
-    m_listCallbacks.insert(url, std::move(callback));
-    zent::watchReply(manager(m_listManager, SLOT(messageListRequestFinished(QNetworkReply*)))->get(request));
+    m_listCallbacks[url] = std::move(callback);
+    zent::watchReply(m_listManager->get(request), m_timeLimit);
     return 0;
 }
 
@@ -137,15 +137,15 @@ int QNotification::getNotifyMessageList(const QString& uid, bool isNotRead, int 
 
 int QNotification::readNotifyMessage(const QString& uuid, read_message_callback callback)
 {
-    put(manager(m_readManager, SLOT(messageReadRequestFinished(QNetworkReply*))), m_readUrl, QStringLiteral("uuid"),
-        uuid, "readNotifyMessage", m_readCallbacks, std::move(callback));
+    put(m_readManager, m_readUrl, QStringLiteral("uuid"), uuid, "readNotifyMessage", m_readCallbacks,
+        std::move(callback));
     return 0;
 }
 
 int QNotification::readAllNotifyMessage(const QString& uid, readall_message_callback callback)
 {
-    put(manager(m_readAllManager, SLOT(messageReadAllRequestFinished(QNetworkReply*))), m_readAllUrl,
-        QStringLiteral("uid"), uid, "readAllNotifyMessage", m_readAllCallbacks, std::move(callback));
+    put(m_readAllManager, m_readAllUrl, QStringLiteral("uid"), uid, "readAllNotifyMessage", m_readAllCallbacks,
+        std::move(callback));
     return 0;
 }
 
@@ -157,8 +157,8 @@ void QNotification::put(QNetworkAccessManager* manager, const QString& baseUrl, 
     const QUrl url = zent::withQuery(QUrl(baseUrl), {{kTimeParameter, timeStamp()}});
     qDebug() << "Qurl" << url;
     const QNetworkRequest request = makeRequest(url, caller);
-    callbacks.insert(url, std::move(callback));
-    zent::watchReply(manager->put(request, body));
+    callbacks[url] = std::move(callback);
+    zent::watchReply(manager->put(request, body), m_timeLimit);
 }
 
 void QNotification::messageListRequestFinished(QNetworkReply* reply)
@@ -169,18 +169,15 @@ void QNotification::messageListRequestFinished(QNetworkReply* reply)
     if (!callback)
         return;
     NotifyMessageResponse response;
-    response.is_not_read = QUrlQuery(reply->request().url()).queryItemValue(kUnreadParameter).toInt() == 1;
     const bool ok = zent::succeeded(reply);
     if (ok) {
-        response.total = reply->rawHeader("X-Total-Count").toInt();
-        response.limit = reply->rawHeader("X-Total-Limit").toInt();
-        response.offset = reply->rawHeader("X-Total-Offset").toInt();
         const QByteArray body = reply->readAll();
-        response.messages = zent::parseMessageList(body);
+        response = zent::parseMessageReply([reply](const QByteArray& name) { return reply->rawHeader(name); }, body);
         // The count alone is what most callers want; a list that is asked for and is none leaves a trace.
         if (response.messages.isEmpty() && !body.isEmpty() && body.trimmed() != "[]")
             qWarning() << "the message list holds no message";
     }
+    response.is_not_read = QUrlQuery(reply->request().url()).queryItemValue(kUnreadParameter).toInt() == 1;
     callback(ok, response);
 }
 
@@ -198,8 +195,12 @@ void QNotification::finishRead(QNetworkReply* reply, ReadCallbacks& callbacks)
 {
     reply->deleteLater();
     const read_message_callback callback = callbacks.take(reply->request().url());
-    if (callback)
-        callback(zent::succeeded(reply), reply->errorString());
+    if (!callback)
+        return;
+    // Later: the line about a failure comes first, and the callback may stay in a box until that is closed.
+    QMetaObject::invokeMethod(
+        this, [callback, ok = zent::succeeded(reply), text = reply->errorString()] { callback(ok, text); },
+        Qt::QueuedConnection);
 }
 
 QString QNotification::getCurrentTime()

@@ -1,6 +1,8 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "notifymessages.h"
+#include "httprules.h"
+#include "messages/notifymessages.h"
 
 #include <QMap>
 #include <QNetworkRequest>
@@ -23,7 +25,7 @@ using readall_message_callback = std::function<void(bool ok, QString text)>;
 
 /// Client of the notification service, which keeps a message box for every user. Results come through the callback
 /// handed in with a request; what the callback refers to must outlive the request or be guarded by it. A request that
-/// gets no answer fails after 30 s.
+/// is not answered whole within 30 s fails.
 class QNotification : public QObject
 {
     Q_OBJECT
@@ -45,11 +47,7 @@ public:
                              list_message_callback callback);
     /// Marks one message read. Always 0; failures reach the callback.
     int readNotifyMessage(const QString& uuid, read_message_callback callback);
-    /// Marks all messages of a user read. Always 0; failures reach the callback.
-    int readAllNotifyMessage(const QString& uid, readall_message_callback callback);
 
-    /// The local time now as "yyyy-MM-dd hh:mm:ss".
-    static QString getCurrentTime();
     /// A server time as it is shown, at UTC+8; with the words for today and yesterday when `relative`. Empty when the
     /// text is no time.
     static QString formatTime(const QString& serverTime, bool relative);
@@ -59,9 +57,10 @@ public:
     /// wait would cross midnight.
     static void msleep(int ms);
 
+    /// Changes how long a request may take, for those made from now on.
+    void setTimeLimit(std::chrono::milliseconds time) { m_timeLimit = time; }
+
     QString listUrl() const { return m_listUrl; }
-    QString readUrl() const { return m_readUrl; }
-    QString readAllUrl() const { return m_readAllUrl; }
     /// How many requests still wait for their reply.
     int pendingRequests() const { return m_listCallbacks.size() + m_readCallbacks.size() + m_readAllCallbacks.size(); }
 
@@ -73,13 +72,11 @@ private slots:
 private:
     using ReadCallbacks = QMap<QUrl, read_message_callback>;
 
-    /// Made on first use: the first one of the process loads Qt's network management, which the tray icon shall not
-    /// wait for.
-    QNetworkAccessManager* manager(QNetworkAccessManager*& member, const char* finishedSlot);
     QNetworkRequest makeRequest(const QUrl& url, const char* caller);
+    void followAuthority();
     void put(QNetworkAccessManager* manager, const QString& baseUrl, const QString& key, const QString& value,
              const char* caller, ReadCallbacks& callbacks, read_message_callback callback);
-    static void finishRead(QNetworkReply* reply, ReadCallbacks& callbacks);
+    void finishRead(QNetworkReply* reply, ReadCallbacks& callbacks);
 
     QString m_listUrl;
     QString m_readUrl;
@@ -88,9 +85,21 @@ private:
     QMap<QUrl, list_message_callback> m_listCallbacks;
     ReadCallbacks m_readCallbacks;
     ReadCallbacks m_readAllCallbacks;
-    QNetworkAccessManager* m_listManager = nullptr;
-    QNetworkAccessManager* m_readManager = nullptr;
-    QNetworkAccessManager* m_readAllManager = nullptr;
+    QNetworkAccessManager* m_listManager;
+    QNetworkAccessManager* m_readManager;
+    QNetworkAccessManager* m_readAllManager;
     /// Comes with the first request: making even an empty one loads OpenSSL.
     std::optional<QSslConfiguration> m_ssl;
+    /// The authority's file as it was when it was read.
+    QByteArray m_authority;
+    /// Connections may be left that were made with another authority.
+    bool m_oldConnections = false;
+    std::chrono::milliseconds m_timeLimit = zent::http::kBackgroundTime;
+
+    // Agreed with other components, and called by them only.
+public:
+    /// Marks all messages of a user read. Always 0; failures reach the callback.
+    int readAllNotifyMessage(const QString& uid, readall_message_callback callback);
+    /// The local time now as "yyyy-MM-dd hh:mm:ss".
+    static QString getCurrentTime();
 };

@@ -1,7 +1,8 @@
-#include "notifymessages.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "messages/notifymessages.h"
 
-#include "filecontent.h"
 #include "jsonreader.h"
+#include "terminalinfo.h"
 
 #include <QDateTime>
 #include <QJsonArray>
@@ -15,19 +16,19 @@ namespace
 {
 
 constexpr int kHttpsPort = 443;
-/// The platform's users live at UTC+8, whatever zone the terminal is set to.
+/// Times are shown at UTC+8, whatever the terminal's own zone, as agreed.
 constexpr int kDisplayOffsetSeconds = 28800;
 
-/// Nothing when a value is no text.
-std::optional<NotifyMessage> messageFromJson(const QJsonValue& value)
+NotifyMessage messageFromJson(const QJsonObject& object)
 {
-    base::JsonReader reader(value);
-    NotifyMessage message{reader.text("uuid"),   reader.text("uid"),     reader.text("send_uid"),
-                          reader.text("title"),  reader.text("content"), reader.text("created_at"),
-                          reader.text("read_at")};
-    if (!reader.isGood())
-        return std::nullopt;
-    return message;
+    const auto text = [&object](const char* key) { return object.value(QLatin1String(key)).toString(); };
+    return {base::identifierIn(object.value(QLatin1String("uuid"))),
+            text("uid"),
+            text("send_uid"),
+            text("title"),
+            text("content"),
+            text("created_at"),
+            text("read_at")};
 }
 
 } // namespace
@@ -48,7 +49,7 @@ std::optional<NotifyConfig> parseNotifyConfig(const QByteArray& infoFile)
     config.protocol = object.value(QLatin1String("protocol")).toString(config.protocol);
     config.host = object.value(base::infokey::kServerHost).toString();
     config.prefix = object.value(QLatin1String("notificition_prefix")).toString(config.prefix);
-    config.token = object.value(QLatin1String("token")).toString();
+    config.token = base::identifierIn(object.value(QLatin1String("token")));
     if (config.protocol == QLatin1String("https"))
         config.port = kHttpsPort;
     // A number here, while the scene requests read the same key as text; a text gives port 0.
@@ -60,11 +61,22 @@ std::optional<NotifyConfig> parseNotifyConfig(const QByteArray& infoFile)
 QList<NotifyMessage> parseMessageList(const QByteArray& body)
 {
     QList<NotifyMessage> messages;
-    for (const QJsonValue& value : QJsonDocument::fromJson(body).array()) {
-        if (const auto message = messageFromJson(value))
-            messages.append(*message);
+    const QJsonArray elements = QJsonDocument::fromJson(body).array();
+    for (const QJsonValue& value : elements) {
+        if (value.isObject())
+            messages.append(messageFromJson(value.toObject()));
     }
     return messages;
+}
+
+NotifyMessageResponse parseMessageReply(const HeaderLookup& header, const QByteArray& body)
+{
+    NotifyMessageResponse response;
+    response.total = header("X-Total-Count").toInt();
+    response.limit = header("X-Total-Limit").toInt();
+    response.offset = header("X-Total-Offset").toInt();
+    response.messages = parseMessageList(body);
+    return response;
 }
 
 QString formatServerTime(const QString& serverTime, bool relative, const QDate& today)

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QByteArray>
@@ -5,6 +6,7 @@
 #include <QList>
 #include <QString>
 
+#include <functional>
 #include <optional>
 
 /// One message of the notification service.
@@ -61,12 +63,18 @@ struct NotifyConfig {
 /// Reads the notification settings out of a terminal info file; nothing when it is not JSON.
 std::optional<NotifyConfig> parseNotifyConfig(const QByteArray& infoFile);
 
-/// The messages of a list reply in their order, without those that hold something else than texts; none when the body
-/// is not a JSON array.
+/// The messages of a list reply in their order; none when the body is not a JSON array. A value that is missing or no
+/// text reads as an empty one, and what is no object is left out.
 QList<NotifyMessage> parseMessageList(const QByteArray& body);
 
-/// A server time (UTC, ISO 8601) as it is shown, at UTC+8: "yyyy/MM/dd hh:mm" or, when `relative`, "今天 hh:mm" and
-/// "昨天 hh:mm" for `today` and the day before. Empty when the text is no time.
+/// Header of a reply by its name; empty where it is missing.
+using HeaderLookup = std::function<QByteArray(const QByteArray& name)>;
+
+/// A list reply's counts and messages. A header that is missing or no number counts as 0.
+NotifyMessageResponse parseMessageReply(const HeaderLookup& header, const QByteArray& body);
+
+/// A server time (UTC, ISO 8601) as it is shown, at UTC+8: "yyyy/MM/dd hh:mm". When `relative`, `today` and the day
+/// before are "今天 hh:mm" and "昨天 hh:mm". Empty when the text is no time.
 QString formatServerTime(const QString& serverTime, bool relative, const QDate& today);
 
 /// Today at UTC+8.

@@ -1,4 +1,5 @@
-#include "iconbutton.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "panel/iconbutton.h"
 
 #include "toolkitlabel.h"
 

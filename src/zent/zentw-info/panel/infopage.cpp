@@ -1,5 +1,7 @@
-#include "infopage.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "panel/infopage.h"
 
+#include "displaytext.h"
 #include "toolkitlabel.h"
 
 #include <QGridLayout>
@@ -7,14 +9,14 @@
 namespace
 {
 
-constexpr QSize pageSize(278, 310);
-constexpr QSize captionSize(56, 18);
-constexpr QSize valueSize(170, 18);
+constexpr QSize kPageSize(278, 310);
+constexpr QSize kCaptionSize(56, 18);
+constexpr QSize kValueSize(170, 18);
 /// The same on every page, so that the values keep their place when the page changes.
-constexpr int captionColumn = 76;
-constexpr int columnGap = 14;
+constexpr int kCaptionColumn = 76;
+constexpr int kColumnGap = 14;
 /// Eight rows at this distance fill the part of the page that the panel shows.
-constexpr int rowGap = 14;
+constexpr int kRowGap = 14;
 
 void setTextColor(QWidget* widget, const QColor& color)
 {
@@ -24,7 +26,7 @@ void setTextColor(QWidget* widget, const QColor& color)
     widget->setPalette(palette);
 }
 
-/// False for a text so short that it fits without measuring, which loads the fonts: hardly a character is wider than
+/// False for a text so short that it fits without measuring, which loads the fonts. Hardly a character is wider than
 /// its font is high, and the label fades out what is.
 bool mayOverflow(const ToolkitLabel& label, const QString& text)
 {
@@ -36,22 +38,22 @@ bool mayOverflow(const ToolkitLabel& label, const QString& text)
 
 InfoPage::InfoPage(const QVector<Row>& rows, QWidget* parent) : QWidget(parent)
 {
-    setFixedSize(pageSize);
+    setFixedSize(kPageSize);
     auto* grid = new QGridLayout(this);
     grid->setContentsMargins(0, 0, 0, 0);
-    grid->setHorizontalSpacing(columnGap);
-    grid->setVerticalSpacing(rowGap);
-    grid->setColumnMinimumWidth(0, captionColumn);
+    grid->setHorizontalSpacing(kColumnGap);
+    grid->setVerticalSpacing(kRowGap);
+    grid->setColumnMinimumWidth(0, kCaptionColumn);
     grid->setColumnStretch(1, 1);
     for (int row = 0; row < rows.size(); ++row) {
         auto* caption = new ToolkitLabel(rows[row].caption, this);
         caption->setObjectName(QLatin1String(rows[row].captionName));
-        caption->setFixedSize(captionSize);
+        caption->setFixedSize(kCaptionSize);
         setTextColor(caption, QColor(0, 0, 0, 150));
 
         auto* value = new ToolkitLabel(this);
         value->setObjectName(QLatin1String(rows[row].valueName));
-        value->setFixedSize(valueSize);
+        value->setFixedSize(kValueSize);
         setTextColor(value, QColor(0, 0, 0, 255));
         caption->setBuddy(value);
 
@@ -70,8 +72,9 @@ void InfoPage::setCaptionWidth(int row, int width)
     m_captions[row]->setFixedWidth(width);
 }
 
-void InfoPage::setValue(int row, const QString& text, Overflow overflow)
+void InfoPage::setValue(int row, const QString& whole, Overflow overflow)
 {
+    const QString text = zent::display::cut(whole);
     ToolkitLabel* label = m_values[row];
     // A screen reader meets the value alone; its name says what the value is, and says it whole.
     label->setAccessibleName(m_captions[row]->text() + QStringLiteral("：") + text);

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QVector>
@@ -26,8 +27,9 @@ public:
     /// Makes one caption, which needs more room than the others, @p width pixels wide.
     void setCaptionWidth(int row, int width);
 
-    /// Shows @p text in @p row. A tool tip that an earlier, longer text left is not removed.
-    void setValue(int row, const QString& text, Overflow overflow);
+    /// Shows @p whole in @p row, cut where it is very long. A tool tip that an earlier, longer text left is not
+    /// removed.
+    void setValue(int row, const QString& whole, Overflow overflow);
 
 private:
     QVector<ToolkitLabel*> m_captions;

@@ -1,8 +1,11 @@
-#include "infowidget.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "panel/infowidget.h"
 
-#include "infopage.h"
-#include "lunarcalendar.h"
-#include "screens.h"
+#include "displaytext.h"
+#include "panel/infopage.h"
+#include "panel/lunarcalendar.h"
+#include "screen/screens.h"
+#include "screen/showwindow.h"
 #include "themehelper.h"
 #include "toolkitbuttonbox.h"
 #include "toolkitcombobox.h"
@@ -22,16 +25,16 @@
 namespace
 {
 
-constexpr int panelWidth = 300;
-constexpr int panelHeight = 469;
-constexpr int panelHeightWithScenes = 515;
-constexpr QSize lineSize(298, 1);
-constexpr int sceneRowIndex = 7;
+constexpr int kPanelWidth = 300;
+constexpr int kPanelHeight = 469;
+constexpr int kPanelHeightWithScenes = 515;
+constexpr QSize kLineSize(298, 1);
+constexpr int kSceneRowIndex = 7;
 /// Where the pages begin in their container, below the button box.
-constexpr int pagesTop = 52;
+constexpr int kPagesTop = 52;
 /// Added to the layout's right margin, it makes the margins on both sides look the same.
-constexpr int rightInset = 5;
-constexpr int dateRefreshMs = 1000000;
+constexpr int kRightInset = 5;
+constexpr int kDateRefreshMs = 1000000;
 
 QString shared(const char* text)
 {
@@ -43,11 +46,11 @@ class SeparatorItem : public QWidgetItem
 {
 public:
     using QWidgetItem::QWidgetItem;
-    QSize sizeHint() const override { return {0, lineSize.height()}; }
+    QSize sizeHint() const override { return {0, kLineSize.height()}; }
     QSize minimumSize() const override { return sizeHint(); }
     void setGeometry(const QRect& rect) override
     {
-        widget()->move((widget()->parentWidget()->width() - lineSize.width()) / 2, rect.y());
+        widget()->move((widget()->parentWidget()->width() - kLineSize.width()) / 2, rect.y());
     }
 };
 
@@ -64,7 +67,7 @@ InfoWidget::InfoWidget(QWidget* parent, bool showRelease) : QWidget(parent)
     m_line = new QFrame(this);
     m_line->setObjectName(QStringLiteral("line"));
     m_line->setFrameShape(QFrame::HLine);
-    m_line->setFixedSize(lineSize);
+    m_line->setFixedSize(kLineSize);
     QPalette linePalette = m_line->palette();
     linePalette.setColor(QPalette::WindowText, QColor(0, 0, 0, 36));
     m_line->setPalette(linePalette);
@@ -137,7 +140,7 @@ void InfoWidget::initLoginInfoWidget()
                                 {shared("部门"), "department", "departmentValue"},
                                 {shared("登录时间"), "ipV4GatewayLabel", "loginValue"}},
                                m_pages);
-    m_loginPage->move(0, pagesTop);
+    m_loginPage->move(0, kPagesTop);
     m_loginPage->setCaptionWidth(0, 76);
     m_loginPage->setValue(5, QDateTime::currentDateTime().toString(QStringLiteral("yyyy-MM-dd hh:mm:ss")),
                           InfoPage::Overflow::Clip);
@@ -154,7 +157,7 @@ void InfoWidget::initNetInfoWidget()
                               {shared("子网掩码"), "subnetmaskLabel", "subnetmaskValue"},
                               {shared("速率"), "netSpeedLabel", "netspeedValue"}},
                              m_pages);
-    m_netPage->move(0, pagesTop);
+    m_netPage->move(0, kPagesTop);
 }
 
 QHBoxLayout* InfoWidget::createBottomRow(bool showRelease)
@@ -214,7 +217,7 @@ void InfoWidget::layOut(bool showRelease)
     m_layout->addItem(new SeparatorItem(m_line));
     m_layout->addSpacing(10);
     m_layout->addWidget(m_pages);
-    // The scene row comes here (sceneRowIndex).
+    // The scene row comes here (kSceneRowIndex).
     m_layout->addSpacing(10);
     m_layout->addStretch();
     m_layout->addLayout(createBottomRow(showRelease));
@@ -243,8 +246,8 @@ void InfoWidget::setSceneBox(bool visible)
     m_sceneCaption->setVisible(visible);
     m_sceneBox->setVisible(visible);
     if (!visible) {
-        resize(panelWidth, panelHeight);
-        setFixedHeight(panelHeight);
+        resize(kPanelWidth, kPanelHeight);
+        setFixedHeight(kPanelHeight);
         return;
     }
     auto* row = new QHBoxLayout;
@@ -252,15 +255,18 @@ void InfoWidget::setSceneBox(bool visible)
     row->setContentsMargins(0, 0, 0, 10);
     row->addWidget(m_sceneCaption, 0, Qt::AlignLeft);
     row->addWidget(m_sceneBox, 0, Qt::AlignRight);
-    row->addSpacing(rightInset);
-    m_layout->insertLayout(sceneRowIndex, row);
-    setFixedHeight(panelHeightWithScenes);
+    row->addSpacing(kRightInset);
+    m_layout->insertLayout(kSceneRowIndex, row);
+    setFixedHeight(kPanelHeightWithScenes);
 }
 
 void InfoWidget::setSceneBoxData(const QStringList& names)
 {
+    m_sceneNames += names;
+    QStringList shown;
     for (const QString& name : names)
-        m_sceneBox->addItem(name);
+        shown.append(zent::display::cut(name, zent::display::kSceneNameLength));
+    m_sceneBox->addItems(shown);
 }
 
 void InfoWidget::setCurrentScene(int index)
@@ -270,7 +276,7 @@ void InfoWidget::setCurrentScene(int index)
 
 QString InfoWidget::getCurrentScene() const
 {
-    const QString scene = m_sceneBox->currentText();
+    QString scene = m_sceneNames.value(m_sceneBox->currentIndex());
     qDebug() << "getCurrentScene" << scene;
     return scene;
 }
@@ -283,7 +289,7 @@ void InfoWidget::initTimer()
 {
     auto* timer = new QTimer(this);
     connect(timer, &QTimer::timeout, this, &InfoWidget::updateDateTimer);
-    timer->start(dateRefreshMs);
+    timer->start(kDateRefreshMs);
 }
 
 void InfoWidget::initUIPos()
@@ -329,6 +335,5 @@ void InfoWidget::onOntopStatechanged(int state)
     // Changing the flags hides the window.
     top->setWindowFlags(flags);
     initUIPos();
-    top->show();
-    top->activateWindow();
+    zent::showActive(*top);
 }

@@ -1,6 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "records.h"
+#include "panel/records.h"
 
 #include <QFont>
 #include <QStringList>
@@ -15,9 +16,9 @@ class QVBoxLayout;
 class ToolkitLabel;
 
 /**
- * The body of the main window: the date in both calendars, an optional scene chooser, the login and network pages,
- * and the row with the on-top check box and the links. It shows what it is handed and reports what the user does;
- * it requests nothing itself. Its surface is light on every desktop.
+ * The body of the main window: date lines of both calendars, optional scene chooser, login and network pages, on-top
+ * check box and links. It shows what it is handed and reports what the user does; it requests nothing itself. Its
+ * surface is light on every desktop.
  */
 class InfoWidget : public QWidget
 {
@@ -79,6 +80,8 @@ private:
     ToolkitLabel* m_lunarDate = nullptr;
     ToolkitLabel* m_sceneCaption = nullptr;
     QComboBox* m_sceneBox = nullptr;
+    /// Whole, where the box shows them cut.
+    QStringList m_sceneNames;
     QWidget* m_pages = nullptr;
     InfoPage* m_loginPage = nullptr;
     InfoPage* m_netPage = nullptr;

@@ -1,6 +1,7 @@
-#include "lunarcalendar.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "panel/lunarcalendar.h"
 
-#include "lunartables.h"
+#include "panel/lunartables.h"
 
 #include <QStringBuilder>
 
@@ -47,8 +48,8 @@ LunarDate toLunar(const QDate& date)
     int year = date.year();
     QDate newYear = lunarNewYear(year);
     if (date < newYear) {
-        // Counted from the new year before, not backwards from the coming one: the place in the year then tells the
-        // leap month from the regular one of the same number wherever it lies.
+        // Counted from the previous new year, not backwards from the next one. Its place in the year then tells a leap
+        // month from the regular one of the same number.
         newYear = lunarNewYear(--year);
     }
 
@@ -105,13 +106,13 @@ bool GetSolarTerms(const QDate& date, unsigned int& firstTermDay, unsigned int& 
     if (!isSupported(date))
         return false;
 
-    constexpr int groupLength = 5;
+    constexpr int kGroupLength = 5;
     const int month = date.month();
     const char* group =
-        kSolarTerms[date.year() - kFirstSolarTermYear].digits + static_cast<ptrdiff_t>((month - 1) / 2 * groupLength);
+        kSolarTerms[date.year() - kFirstSolarTermYear].digits + static_cast<ptrdiff_t>((month - 1) / 2 * kGroupLength);
     unsigned int value = 0;
-    const auto [end, error] = std::from_chars(group, group + groupLength, value, 16);
-    if (error != std::errc() || end != group + groupLength)
+    const auto [end, error] = std::from_chars(group, group + kGroupLength, value, 16);
+    if (error != std::errc() || end != group + kGroupLength)
         return false;
 
     const unsigned int days = month % 2 != 0 ? value / 1000 : value % 1000;

@@ -1,4 +1,5 @@
-#include "lunartables.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "panel/lunartables.h"
 
 namespace lunartables
 {

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QStringView>
@@ -13,19 +14,19 @@ inline constexpr int kFirstYear = 1901;
 inline constexpr int kLastYear = 2099;
 inline constexpr int kFirstSolarTermYear = 1900;
 
-/// One word a lunar year, indexed by year - kFirstYear.
+/// One word per lunar year, indexed by year - kFirstYear.
 ///   bits 0-4    day, and
 ///   bits 5-6    month of the Gregorian date of the lunar new year
-///   bits 7-19   month lengths in the year's order, first month at bit 19: set is 30 days, clear 29. A leap month comes
-///               right after the regular month of the same number
+///   bits 7-19   month lengths in the year's order, first month at bit 19: set is 30 days, clear 29
+///               a leap month follows the regular month of the same number
 ///   bits 20-23  number of the leap month, 0 when the year has none
 extern const std::array<quint32, 199> kLunarYears;
 
 /// The lunar year before the table: it holds the Gregorian dates from 1901-01-01 to the lunar new year of 1901.
 inline constexpr quint32 kLunarYear1900 = 0x84B6BF;
 
-/// One Gregorian year's solar terms: six groups of five hexadecimal digits, one a pair of months. A group's value
-/// written in decimal has six digits, three a month: one for the day of its first term, two for that of its second.
+/// One Gregorian year's solar terms: six groups of five hexadecimal digits, one per pair of months. A group's value
+/// written in decimal has six digits, three per month: one for the day of its first term, two for that of its second.
 struct SolarTermRow {
     char digits[31];
 };
@@ -35,7 +36,7 @@ extern const std::array<SolarTermRow, 201> kSolarTerms;
 
 using Text = QStringView;
 
-/// Two names a Gregorian month, starting with January.
+/// Two names per Gregorian month, starting with January.
 inline constexpr std::array<Text, 24> kSolarTermNames = {
     u"小寒", u"大寒", u"立春", u"雨水", u"惊蛰", u"春分", u"清明", u"谷雨", u"立夏", u"小满", u"芒种", u"夏至",
     u"小暑", u"大暑", u"立秋", u"处暑", u"白露", u"秋分", u"寒露", u"霜降", u"立冬", u"小雪", u"大雪", u"冬至"};

@@ -1,12 +1,15 @@
-#include "modifydialog.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "password/modifydialog.h"
 
 #include "dbusnames.h"
-#include "filecontent.h"
-#include "filewrite.h"
-#include "loginname.h"
-#include "noconfig.h"
+#include "displaytext.h"
+#include "frontend/frontend.h"
+#include "httprules.h"
 #include "paths.h"
-#include "thirdscript.h"
+#include "queuedinput.h"
+#include "system/loginname.h"
+#include "terminal/noconfig.h"
+#include "terminalinfo.h"
 #include "toolkitframe.h"
 #include "toolkitlabel.h"
 #include "toolkitpasswordedit.h"
@@ -31,7 +34,6 @@
 namespace
 {
 
-constexpr int kHttpOk = 200;
 constexpr int kMismatchAlertMs = 3000;
 constexpr int kServiceAlertMs = 2000;
 constexpr int kNewPasswordRefused = -500;
@@ -84,7 +86,7 @@ void ModifyDialog::createDialog()
     m_confirm->setObjectName(QStringLiteral("confirm"));
     m_confirm->setDefault(true);
     m_cancel = new ToolkitPushButton(content);
-    // The same name as the other button's: style sheets of the platform address both by it.
+    // The same name as the other button's, as agreed.
     m_cancel->setObjectName(QStringLiteral("confirm"));
     auto* line = new ToolkitFrame(content);
     line->setObjectName(QStringLiteral("line"));
@@ -207,6 +209,7 @@ void ModifyDialog::modifyConfirm()
     // The method's name only: its arguments are passwords.
     qDebug() << "modifyConfirm" << zent::dbus::kIdentityService << method;
     const QDBusMessage reply = QDBusConnection::systemBus().call(message, QDBus::Block);
+    queuedinput::discard();
     // An error's arguments are its own words, not the service's answer.
     const bool answered = reply.type() == QDBusMessage::ReplyMessage;
     takeIdentityReply(answered ? reply.arguments().value(0).toString() : QString());
@@ -281,7 +284,7 @@ void ModifyDialog::onPasswordChecked(QNetworkReply* reply)
 {
     reply->deleteLater();
     QByteArray body = reply->readAll();
-    const bool statusOk = reply->attribute(QNetworkRequest::HttpStatusCodeAttribute).toInt() == kHttpOk;
+    const bool statusOk = zent::http::statusOf(reply) == zent::http::kOk;
     const bool changedThere = analyseData(&body);
     if (!statusOk)
         return;
@@ -300,7 +303,7 @@ bool ModifyDialog::analyseData(QByteArray* body)
         showNotice(reply->data);
         return false;
     }
-    // Built and dropped: the probe is only ever run by hand, with this text at hand in a debugger.
+    // Built and dropped, as agreed: nothing runs the probe.
     const QString probe = QStringLiteral("touch /tmp/demo.txt && echo %1 | su %2").arg(m_probePassword, m_userName);
     Q_UNUSED(probe)
     removePasswdCache();
@@ -317,38 +320,40 @@ bool ModifyDialog::analyseData(QByteArray* body)
 
 void ModifyDialog::removePasswdCache()
 {
-    QProcess::startDetached(zent::kFrontEndInterpreter, zent::thirdScriptArguments(kRemoveCacheScript));
+    zent::frontend::start(zent::frontend::scriptCommand(kRemoveCacheScript));
 }
 
 void ModifyDialog::renewToken(const QString& token)
 {
     const auto log = [](int line) {
         return qDebug() << "文件名: " << QFileInfo(QStringLiteral(__FILE__)).fileName() << "行号: " << line
-                        << "函数名: "
-                        << "renewToken";
+                        << "函数名:  renewToken";
     };
-    QFile file(zent::kUserinfoPath);
-    const auto fail = [&](const QString& reason) {
-        showNotice(zent::noconfig::text(file.fileName(), reason), zent::noconfig::kTitle);
+    const auto fail = [this](const QString& reason) {
+        showNotice(zent::noconfig::text(zent::kUserinfoPath, reason), zent::noconfig::kTitle);
     };
-    if (!file.open(QIODevice::ReadOnly)) {
-        log(__LINE__) << "file open failed!";
-        zent::noconfig::describe(log(__LINE__), file);
-        return fail(file.errorString());
-    }
-    log(__LINE__) << "file open successfully!";
-    auto object = zent::base::parseInfoObject(file.readAll());
-    file.close();
-    if (!object) {
+    using State = zent::base::InfoChange::State;
+    const zent::base::InfoChange change = zent::base::changeTerminalInfo([&](QJsonObject& info) {
+        log(__LINE__) << "file open successfully!";
+        info.insert(kTokenKey, token);
+        return true;
+    });
+    switch (change.state) {
+    case State::Done:
+    case State::Declined:
+        return;
+    case State::NotObject:
+        log(__LINE__) << "file open successfully!";
         log(__LINE__) << "parse file failed!";
         return fail(QStringLiteral("JSON"));
+    case State::NotOpened:
+    case State::NotWritten:
+    case State::Short:
+        break;
     }
-    object->insert(kTokenKey, token);
-    if (zent::base::replaceFile(zent::kUserinfoPath, QJsonDocument(*object).toJson()) !=
-        zent::base::WriteResult::Done) {
-        log(__LINE__) << "file open failed!";
-        fail(QStringLiteral("写入失败"));
-    }
+    log(__LINE__) << "file open failed!";
+    zent::noconfig::describe(log(__LINE__), change.error);
+    fail(change.error.text);
 }
 
 void ModifyDialog::onRestoreReadprocess()
@@ -383,11 +388,5 @@ void ModifyDialog::onRestoreFinishedprocess()
 
 void ModifyDialog::showNotice(const QString& text, const QString& title)
 {
-    // On the heap: this dialog, its parent, may go away while it is open.
-    const QPointer<ToolkitDialog> box = new ToolkitDialog(this);
-    box->setTitle(title);
-    box->setMessage(text);
-    box->addButton(QStringLiteral("确定"), true, ToolkitDialog::ButtonRecommend);
-    box->exec();
-    delete box;
+    tell(this, zent::display::cut(text), title);
 }

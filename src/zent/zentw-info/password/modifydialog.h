@@ -1,6 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "passwordreplies.h"
+#include "password/passwordreplies.h"
 #include "toolkitdialog.h"
 
 #include <QString>
@@ -22,7 +23,6 @@ public:
 
     /// Host and port of the management server, joined by a colon.
     void setIpport(const QString& address);
-    void setToken(const QString&) {}
     void setMachineId(const QString& id);
     /// The user's name and the code of the scene whose length rule holds.
     void setUserName(const QString& name, const QString& sceneCode);
@@ -32,15 +32,6 @@ public:
     void clearPassword();
     void clearRePassword();
 
-    /// Whether the repeated password is as long as the scene's configuration asks for.
-    bool IsPasswordLenthValid();
-    /// Takes the server's answer to a password change: true when it was a success.
-    bool analyseData(QByteArray* body);
-    /// Stores a renewed token in the terminal info file, whose other keys stay. Failures are logged and shown.
-    void renewToken(const QString& token);
-    /// Has the privileged front end remove the cached password.
-    void removePasswdCache();
-
 public slots:
     void onOldpasswordeditTextchanged();
     void onPasswordeditTextchanged();
@@ -48,10 +39,6 @@ public slots:
     void onRepasswordeditFinished();
     void modifyConfirm();
     void modifyClose();
-    /// Tells the user what the restore process printed; there must be one.
-    void onRestoreReadprocess();
-    void onRestoreFinishedprocess();
-    void onPasswordChecked(QNetworkReply* reply);
 
 protected:
     void closeEvent(QCloseEvent* event) override;
@@ -78,4 +65,21 @@ private:
     ToolkitPasswordEdit* m_rePassword;
     QPushButton* m_confirm;
     QPushButton* m_cancel;
+
+    // Agreed with other components, and called by them only.
+public:
+    void setToken(const QString&) {}
+    /// Whether the repeated password is as long as the scene's configuration asks for.
+    bool IsPasswordLenthValid();
+    /// Takes the server's answer to a password change: true when it was a success.
+    bool analyseData(QByteArray* body);
+    /// Stores a renewed token in the terminal info file, whose other keys stay. Failures are logged and shown.
+    void renewToken(const QString& token);
+    /// Has the privileged front end remove the cached password.
+    void removePasswdCache();
+public slots:
+    void onPasswordChecked(QNetworkReply* reply);
+    /// Tells the user what the restore process printed; there must be one.
+    void onRestoreReadprocess();
+    void onRestoreFinishedprocess();
 };

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QByteArray>
@@ -11,6 +12,8 @@ namespace zent
 
 /// The identity service's answer to a password change.
 struct IdentityReply {
+    /// A number that is no 32-bit integer.
+    static constexpr int kUnknownCode = -1;
     /// 0 on success, also where the service sends something that is no number.
     int code = 0;
     QString message;
@@ -32,7 +35,7 @@ struct PasswordServerReply {
 std::optional<PasswordServerReply> parsePasswordServerReply(const QByteArray& body);
 
 /// The least password length that a scene's configuration asks for: 0 when it names none, 8 when it asks for more than
-/// 40 or for less than 0. Nothing when the file is not JSON.
+/// 40 or for less than 0. Nothing when the file is not a JSON object or the length in it is no whole number.
 std::optional<int> parseMinimumLength(const QByteArray& sceneConfig);
 
 /// The least length where no configuration says otherwise.

@@ -1,15 +1,22 @@
-#include "closeguarddialog.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "release/closeguarddialog.h"
 
 #include "busproxy.h"
 #include "dbusnames.h"
+#include "displaytext.h"
 #include "fileconfig.h"
 #include "httprequest.h"
-#include "legacyqt.h"
+#include "httprules.h"
 #include "libzentoxa.h"
 #include "paths.h"
-#include "releasereply.h"
-#include "screens.h"
-#include "spinerwin.h"
+#include "queuedinput.h"
+#include "release/releasereply.h"
+#include "release/schemapath.h"
+#include "release/spinerwin.h"
+#include "screen/screens.h"
+#include "screen/showwindow.h"
+#include "system/childprocess.h"
+#include "terminalinfo.h"
 #include "toolkitframe.h"
 #include "toolkitlabel.h"
 #include "toolkitpasswordedit.h"
@@ -20,7 +27,6 @@
 #include <QDBusPendingCallWatcher>
 #include <QDBusPendingReply>
 #include <QDebug>
-#include <QFile>
 #include <QGSettings>
 #include <QHBoxLayout>
 #include <QIcon>
@@ -30,9 +36,8 @@
 namespace
 {
 
-constexpr int kHttpOk = 200;
-
 const QByteArray kControlCenterSchema = QByteArrayLiteral("com.vantor.oxa.control-center");
+/// The agreed path, for a schema that has none of its own.
 const QByteArray kControlCenterPath = QByteArrayLiteral("/com/vantor/oxa/control-center/");
 
 } // namespace
@@ -62,7 +67,7 @@ void closeGuarddialog::createContent()
     m_password->setEchoMode(QLineEdit::Password);
     m_password->setPlaceholderText(tr("请输入管理员密码"));
     m_password->setAccessibleName(label->text());
-    // It is the administrator's password, typed at somebody else's desk.
+    // It is the administrator's password, typed at a user's terminal.
     m_password->setEchoButtonVisible(false);
 
     auto* close = new ToolkitPushButton(tr(" 关闭 "), content);
@@ -119,13 +124,11 @@ void closeGuarddialog::setIpport(const QString& address)
 
 void closeGuarddialog::getMachineId()
 {
-    QFile file(zent::kMachineidPath);
-    if (!file.exists()) {
+    const zent::base::FileReading file = zent::base::readMachineId();
+    if (!file.exists)
         qDebug() << "no machine.txt to use";
-        return;
-    }
-    if (file.open(QIODevice::ReadOnly))
-        m_machineId = QString::fromUtf8(file.readAll()).remove(QLatin1Char('\n'));
+    else if (file.opened)
+        m_machineId = QString::fromUtf8(file.content).remove(QLatin1Char('\n'));
 }
 
 void closeGuarddialog::onCloseClicked()
@@ -151,6 +154,8 @@ void closeGuarddialog::onCloseguardClicked()
 
 void closeGuarddialog::onRemoveDomainStatus(int status, const QString& body)
 {
+    // The request has blocked the window.
+    queuedinput::discard();
     // The dialog may go away while a message is on the screen.
     const QPointer<ToolkitPasswordEdit> password = m_password;
     const auto refuse = [this, &password](const QString& text) {
@@ -158,7 +163,7 @@ void closeGuarddialog::onRemoveDomainStatus(int status, const QString& body)
         if (password)
             password->clear();
     };
-    if (status != kHttpOk) {
+    if (status != zent::http::kOk) {
         const QString text = QStringLiteral("网络异常，请稍后重试");
         qInfo() << text;
         return refuse(text);
@@ -186,20 +191,20 @@ void closeGuarddialog::startSpinner()
     m_spinner->setPassword(m_password->text());
     m_password->clear();
     zent::screens::placeCentre(*m_spinner);
-    m_spinner->show();
+    zent::showActive(*m_spinner);
     m_spinner->nextCliked();
 }
 
 void closeGuarddialog::forbidEasyLogins()
 {
     if (!QGSettings::isSchemaInstalled(kControlCenterSchema)) {
-        qWarning() << "closeGuarddialog"
-                   << "no schema" << kControlCenterSchema;
+        qWarning() << "closeGuarddialog no schema" << kControlCenterSchema;
         return;
     }
-    QGSettings settings(kControlCenterSchema, kControlCenterPath);
+    const QByteArray ownPath = zent::schemaPath(kControlCenterSchema);
+    QGSettings settings(kControlCenterSchema, ownPath.isEmpty() ? kControlCenterPath : ownPath);
     const QStringList keys = settings.keys();
-    // False although the release loosens everything else: a released terminal must not log anybody in by itself.
+    // False although the release loosens other restrictions; this is agreed and stays.
     for (const QString& key : {QStringLiteral("autoLoginVisable"), QStringLiteral("nopasswdLoginVisable")}) {
         if (keys.contains(key))
             settings.set(key, false);
@@ -228,7 +233,7 @@ void closeGuarddialog::stopUserServices()
 {
     for (const char* command : {"systemctl --global stop zents", "systemctl --global disable zents",
                                 "systemctl --global stop tarn", "systemctl --global disable tarn"})
-        zent::legacy::startDetached(QLatin1String(command));
+        zent::startDetached(QLatin1String(command));
 }
 
 void closeGuarddialog::leaveDomain()
@@ -251,7 +256,7 @@ void closeGuarddialog::onRemoveDomainFinished(QDBusPendingCallWatcher* watcher)
                       QDBusConnection::systemBus());
     if (identity.setRemoteProperty(QStringLiteral("Enable"), false).isValid()) {
         qCritical() << "设置统一认证Enable false 失败";
-        // Without the exclamation mark: support tells the two failures apart by it.
+        // Without the exclamation mark, as agreed.
         return showMessageBox(QStringLiteral("退域执行失败"));
     }
     HttpRequest::GetInstance()->postQuitControl(m_username);
@@ -260,9 +265,5 @@ void closeGuarddialog::onRemoveDomainFinished(QDBusPendingCallWatcher* watcher)
 
 void closeGuarddialog::showMessageBox(const QString& text)
 {
-    // On the heap: the dialog, its parent, may go away while it is open.
-    const QPointer<ToolkitDialog> box = new ToolkitDialog(this);
-    box->setMessage(text);
-    box->exec();
-    delete box;
+    tell(this, zent::display::cut(text), QString(), BareBox);
 }

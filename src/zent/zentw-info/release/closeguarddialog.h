@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include "toolkitdialog.h"
@@ -9,8 +10,8 @@ class QDBusPendingCallWatcher;
 class ToolkitPasswordEdit;
 class spinerWin;
 
-/// The dialog in which an administrator releases the terminal from management: has the server check the password and,
-/// once it is accepted, undoes locally what management did, while the removal worker runs behind the spinner window.
+/// The dialog in which an administrator releases the terminal from management. The server checks the password. Once it
+/// is accepted, the dialog undoes what management did, while the removal worker runs behind the spinner window.
 class closeGuarddialog : public ToolkitDialog
 {
     Q_OBJECT
@@ -21,11 +22,6 @@ public:
     void setUsrname(const QString& name);
     /// Number of the user's scenes.
     void setScencelist(const int& count);
-    void setAreaid(const int& id);
-    /// Host and port of the management server.
-    void setIpport(const QString& address);
-    void setToken(const QString&) {}
-    void checkClosable() {}
 
 public slots:
     void onCloseClicked();
@@ -38,7 +34,6 @@ public slots:
     /// Shows a text and waits until the user has closed it.
     void showMessageBox(const QString& text);
     void getMachineId();
-    void closeallfather();
 
 signals:
     void closeall();
@@ -65,4 +60,14 @@ private:
     int m_sceneCount = 0;
     spinerWin* m_spinner;
     BusProxy* m_domainAgent;
+
+    // Agreed with other components, and called by them only.
+public:
+    void setAreaid(const int& id);
+    /// Host and port of the management server.
+    void setIpport(const QString& address);
+    void setToken(const QString&) {}
+    void checkClosable() {}
+public slots:
+    void closeallfather();
 };

@@ -1,11 +1,11 @@
-#include "controlmanagerthread.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "release/controlmanagerthread.h"
 
-#include "legacyqt.h"
-#include "upgradepriority.h"
+#include "release/upgradepriority.h"
+#include "system/childprocess.h"
 
 #include <QDebug>
 #include <QFile>
-#include <QProcess>
 
 namespace
 {
@@ -19,28 +19,23 @@ void restoreDesktop()
     if (!QFile::exists(script))
         return;
     qDebug() << "ControlManagerThread::doRemoveController()....strRestoreDesktop:" << script;
-    const int result = QProcess::startDetached(QStringLiteral("bash"), {script}) ? 1 : 0;
-    qDebug() << "doRemoveController"
-             << "...execute...strRestoreDesktop:" << script << ":nRet:" << result;
+    const int result = zent::startDetached(QStringLiteral("bash"), {script}) ? 1 : 0;
+    qDebug() << "doRemoveController ...execute...strRestoreDesktop:" << script << ":nRet:" << result;
 }
 
 /// The directory login restore script, run with root rights; whether it exists is the front end's business.
 void restoreDirectoryLogin()
 {
     const QString script = kBasePath + QStringLiteral("/restore_ldap.bash");
-    qDebug() << "doRemoveController"
-             << ".....upgradeScript start:" << script;
+    qDebug() << "doRemoveController .....upgradeScript start:" << script;
     UpgradePriority::GetInstance()->upgradeScriptAsy({script}, false);
-    qDebug() << "doRemoveController"
-             << ".....upgradeScript end:" << script;
+    qDebug() << "doRemoveController .....upgradeScript end:" << script;
 }
 
 void showControlCenterModules()
 {
-    zent::legacy::startDetached(
-        QStringLiteral("gsettings set com.vantor.oxa.control-center hide-module %1").arg(QStringLiteral("\"[]\"")));
-    qDebug() << "doRemoveController"
-             << ".....execute hide-module:";
+    zent::startDetached(QStringLiteral("gsettings set com.vantor.oxa.control-center hide-module \"[]\""));
+    qDebug() << "doRemoveController .....execute hide-module:";
 }
 
 } // namespace
@@ -75,8 +70,8 @@ void ControlManagerThread::stop()
 
 void ControlManagerThread::run()
 {
-    // Not a loop: a call of removeControlManager() between the end of the pass and the end of the thread clears the
-    // flag, and a loop would go round again.
+    // Not a loop: a call of removeControlManager() just before the end of the thread clears the flag, and a loop would
+    // go round again.
     if (!m_stop)
         doRemoveController();
 }

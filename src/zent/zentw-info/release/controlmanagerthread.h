@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QString>
@@ -6,7 +7,7 @@
 #include <atomic>
 
 /**
- * Puts the terminal's own configuration back as it was before it joined management, on a thread of its own: the
+ * Puts the terminal's own configuration back as it was before it joined management. A thread of its own restores the
  * desktop, the directory login and the control centre's modules. No step that fails stops the others.
  */
 class ControlManagerThread : public QThread
@@ -18,14 +19,8 @@ public:
     /// Waits for a pass that is under way.
     ~ControlManagerThread() override;
 
-    /// Stores the application's path and its folder of scripts. The removal depends on neither.
-    void setAppPath(const QString& path);
-
     /// Starts one pass of the removal; while one is under way there is no second.
     void removeControlManager();
-
-    /// Prevents a pass that has not begun. One that has begun goes on to its end.
-    void stop();
 
 signals:
     /// The pass has ended, whatever came of its steps; sent from the worker's thread.
@@ -42,4 +37,11 @@ private:
     QString m_defaultBasePath;
     QString m_scriptsPath;
     QString m_strCancelGroup;
+
+    // Agreed with other components, and called by them only.
+public:
+    /// Stores the application's path and its folder of scripts. The removal depends on neither.
+    void setAppPath(const QString& path);
+    /// Prevents a pass that has not begun. One that has begun goes on to its end.
+    void stop();
 };

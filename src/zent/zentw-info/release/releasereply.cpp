@@ -1,4 +1,5 @@
-#include "releasereply.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "release/releasereply.h"
 
 #include <QJsonDocument>
 #include <QJsonObject>

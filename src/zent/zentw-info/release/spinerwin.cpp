@@ -1,8 +1,10 @@
-#include "spinerwin.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "release/spinerwin.h"
 
 #include "busproxy.h"
-#include "controlmanagerthread.h"
 #include "dbusnames.h"
+#include "queuedinput.h"
+#include "release/controlmanagerthread.h"
 #include "toolkitframe.h"
 #include "toolkitlabel.h"
 #include "toolkitpushbutton.h"
@@ -46,6 +48,7 @@ void spinerWin::createContent()
 
     m_label = new ToolkitLabel(content);
     m_label->setFont(font);
+    m_label->setMinimumWidth(200);
     m_label->setFixedHeight(36);
     m_spinner = new ToolkitSpinner(content);
     m_spinner->setFixedSize(20, 20);
@@ -151,6 +154,7 @@ void spinerWin::closeGuardCliked()
     auto* loginManager = new BusProxy(zent::dbus::kLoginService, zent::dbus::kLoginPath, zent::dbus::kLoginInterface,
                                       QDBusConnection::systemBus(), this);
     const QDBusMessage answer = loginManager->call(QDBus::Block, QStringLiteral("Reboot"), true);
+    queuedinput::discard();
     if (answer.type() == QDBusMessage::ErrorMessage)
         qWarning() << "reboot" << answer.errorMessage();
     loginManager->deleteLater();

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include "toolkitdialog.h"
@@ -9,8 +10,8 @@ class QPushButton;
 class ToolkitSpinner;
 class ToolkitSuggestButton;
 
-/// The window behind which the terminal is released: it turns a spinner while the removal worker runs, cannot be closed
-/// until that ends, and then offers to reboot.
+/// The window behind which the terminal is released. It shows a spinner while the removal worker runs, and cannot be
+/// closed until that ends. Then it offers to reboot.
 class spinerWin : public ToolkitDialog
 {
     Q_OBJECT

@@ -1,10 +1,12 @@
-#include "upgradepriority.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "release/upgradepriority.h"
 
-#include "thirdscript.h"
+#include "frontend/frontend.h"
 
 #include <QDebug>
-#include <QProcess>
 #include <QThread>
+
+#include <utility>
 
 namespace
 {
@@ -20,23 +22,23 @@ QStringList makeArguments(const char* function, const QStringList& list)
     const QStringList scriptArguments = list.mid(1);
     for (const QString& word : scriptArguments)
         qDebug() << function << " strList:" << word;
-    const QStringList arguments = zent::thirdScriptArguments(list.first(), scriptArguments);
-    // This includes the token: with it support staff can repeat the request by hand.
-    for (const QString& word : arguments)
+    QStringList arguments = zent::frontend::scriptCommand(list.first(), scriptArguments);
+    // This includes the token, as agreed.
+    for (const QString& word : std::as_const(arguments))
         qDebug() << function << " strCmdList:" << word;
     return arguments;
 }
 
 int runOnce(const char* function, const QStringList& arguments)
 {
-    const int result = QProcess::execute(zent::kFrontEndInterpreter, arguments);
+    const int result = zent::frontend::run(arguments);
     qDebug() << function << " nRet:" << result;
     return result;
 }
 
 int launchOnce(const char* function, const QStringList& arguments)
 {
-    const int result = QProcess::startDetached(zent::kFrontEndInterpreter, arguments) ? 1 : 0;
+    const int result = zent::frontend::start(arguments) ? 1 : 0;
     qDebug() << function << " nRet:" << result;
     return result;
 }
@@ -63,7 +65,7 @@ int UpgradePriority::upgradeScript(const QStringList& list, bool flag)
     int result = 0;
     for (int attempt = 1; attempt <= kAttempts; ++attempt) {
         result = runOnce(kFunction, arguments);
-        // After a success as well: what the script has changed settles before the caller goes on.
+        // After a success as well, as agreed.
         QThread::sleep(static_cast<unsigned long>(attempt));
         if (result == 0)
             break;
@@ -80,7 +82,7 @@ int UpgradePriority::upgradeScriptAsy(const QStringList& list, bool flag)
     if (!flag) {
         result = launchOnce(kFunction, arguments);
     } else {
-        // Success leads to the next launch: nobody sees how a detached script fares, so it is simply sent three times.
+        // A success leads to the next launch, as agreed.
         for (int attempt = 1; attempt <= kAttempts; ++attempt) {
             result = launchOnce(kFunction, arguments);
             QThread::sleep(static_cast<unsigned long>(attempt));
@@ -88,7 +90,6 @@ int UpgradePriority::upgradeScriptAsy(const QStringList& list, bool flag)
                 break;
         }
     }
-    // The front end needs a moment to take the request up before the caller's next step.
     QThread::msleep(kLaunchPauseMs);
     return result;
 }

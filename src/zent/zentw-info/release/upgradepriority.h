@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QObject>
@@ -18,14 +19,6 @@ public:
     /// The process-wide instance.
     static UpgradePriority* GetInstance();
 
-    /// Stores an upgrade path. Nothing here depends on it.
-    void setUpgradePath(const QString& path);
-
-    /// Runs the script and waits for it. With `flag` true once; with `flag` false up to three times until it succeeds,
-    /// followed by pauses of 1, 2 and 3 s. Returns the last run's exit code, -2 when it could not be started or -1
-    /// when it crashed.
-    int upgradeScript(const QStringList& list, bool flag);
-
     /// Starts the script detached. With `flag` false once; with `flag` true three times unless a start fails, each
     /// followed by a pause of 1, 2 and 3 s. Ends with a pause of 1 s in every case. Returns 1, or 0 when a start
     /// failed; how the script fares is not observed.
@@ -35,4 +28,13 @@ private:
     UpgradePriority() = default;
 
     QString m_strUpgradePath;
+
+    // Agreed with other components, and called by them only.
+public:
+    /// Stores an upgrade path. Nothing here depends on it.
+    void setUpgradePath(const QString& path);
+    /// Runs the script and waits for it. With `flag` true once; with `flag` false up to three times until it succeeds,
+    /// followed by pauses of 1, 2 and 3 s. Returns the last run's exit code, -2 when it could not be started or -1
+    /// when it crashed.
+    int upgradeScript(const QStringList& list, bool flag);
 };

@@ -1,6 +1,8 @@
-#include "desktopnotifier.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "session/desktopnotifier.h"
 
-#include "notificationnames.h"
+#include "displaytext.h"
+#include "session/notificationnames.h"
 
 #include <QDBusConnection>
 #include <QDBusError>
@@ -9,8 +11,10 @@
 #include <QDBusPendingReply>
 #include <QDBusServiceWatcher>
 #include <QDebug>
+#include <QTimer>
 #include <QVariantMap>
 
+#include <limits>
 #include <utility>
 
 namespace
@@ -20,6 +24,7 @@ using zent::dbus::kDesktopNotificationsPath;
 using zent::dbus::kDesktopNotificationsService;
 
 constexpr int kCallTimeoutMs = 5000;
+constexpr int kNoTimeout = std::numeric_limits<int>::max();
 constexpr int kServerDecidesExpiry = -1;
 constexpr uint kReplacesNone = 0;
 const QString kApplicationName = QStringLiteral("域管平台");
@@ -72,7 +77,8 @@ QDBusPendingCallWatcher* DesktopNotifier::call(const QDBusMessage& question, Fun
 
 void DesktopNotifier::notify(const QString& title, const QString& sender, const QString& text)
 {
-    const Message message{title, sender, text};
+    const Message message{zent::display::cut(title), zent::display::cut(sender),
+                          zent::display::cut(text, zent::display::kContentLength)};
     if (!QDBusConnection::sessionBus().isConnected()) {
         // A call on a bus that is not there would never finish.
         QMetaObject::invokeMethod(
@@ -117,8 +123,7 @@ void DesktopNotifier::onCapabilities(const QDBusPendingCall& call)
     m_capabilities = reply.isValid() ? Capabilities::Known : Capabilities::Unknown;
     m_bodyMarkup = reply.isValid() && reply.value().contains(QStringLiteral("body-markup"));
     if (reply.isError()) {
-        qWarning() << "DesktopNotifier"
-                   << "GetCapabilities" << reply.error().name() << reply.error().message();
+        qWarning() << "DesktopNotifier GetCapabilities" << reply.error().name() << reply.error().message();
         giveUpWaiting();
         return;
     }
@@ -135,12 +140,36 @@ void DesktopNotifier::send(const Message& message)
     question << kApplicationName << kReplacesNone << kIconName << shown(message.title)
              << shown(body(message.sender, message.text)) << QStringList{kDefaultAction, kActionLabel}
              << QVariantMap{{QStringLiteral("desktop-entry"), kIconName}} << kServerDecidesExpiry;
-    call(question, [this, message, server = m_server](const QDBusPendingCall& answer) {
-        if (server == m_server)
-            onSent(answer, message);
-        else if (answer.isError())
-            giveUp(message);
+    // Without the call's own time limit, behind which a late answer would be lost.
+    auto* watcher = new QDBusPendingCallWatcher(QDBusConnection::sessionBus().asyncCall(question, kNoTimeout), this);
+    auto* patience = new QTimer(watcher);
+    patience->setSingleShot(true);
+    patience->start(kCallTimeoutMs);
+    connect(patience, &QTimer::timeout, this, [this, message] {
+        qWarning() << "DesktopNotifier Notify" << QDBusError::errorString(QDBusError::NoReply);
+        giveUp(message);
     });
+    connect(watcher, &QDBusPendingCallWatcher::finished, this, [this, watcher, patience, message, server = m_server] {
+        watcher->deleteLater();
+        if (!patience->isActive())
+            withdraw(*watcher);
+        else if (server == m_server)
+            onSent(*watcher, message);
+        else if (watcher->isError())
+            giveUp(message);
+        patience->stop();
+    });
+}
+
+void DesktopNotifier::withdraw(const QDBusPendingCall& call)
+{
+    // The message has been shown otherwise since.
+    const QDBusPendingReply<uint> reply = call;
+    if (!reply.isValid())
+        return;
+    QDBusMessage question = methodCall(QStringLiteral("CloseNotification"));
+    question << reply.value();
+    QDBusConnection::sessionBus().send(question);
 }
 
 void DesktopNotifier::onSent(const QDBusPendingCall& call, const Message& message)
@@ -150,8 +179,7 @@ void DesktopNotifier::onSent(const QDBusPendingCall& call, const Message& messag
         m_ids.insert(reply.value());
         return;
     }
-    qWarning() << "DesktopNotifier"
-               << "Notify" << reply.error().name() << reply.error().message();
+    qWarning() << "DesktopNotifier Notify" << reply.error().name() << reply.error().message();
     giveUp(message);
 }
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QDBusPendingCall>
@@ -51,6 +52,8 @@ private:
     void send(const Message& message);
     void onSent(const QDBusPendingCall& call, const Message& message);
     void giveUp(const Message& message);
+    /// Closes a notification that came after its message had been given up.
+    void withdraw(const QDBusPendingCall& call);
     void giveUpWaiting();
     /// Calls `finished` with the answer, or with an error after 5 s, always through the event loop.
     template <typename Function>

@@ -1,27 +1,22 @@
-#include "sessionhost.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "session/sessionhost.h"
 
 #include "dbusnames.h"
-#include "desktopnotifier.h"
 #include "filecontent.h"
 #include "httprequest.h"
-#include "loginname.h"
-#include "mainwindow.h"
-#include "notify.h"
-#include "replies.h"
-#include "resumedialog.h"
-#include "trayhost.h"
+#include "integrity/resumedialog.h"
+#include "mainwindow/mainwindow.h"
+#include "replies/replies.h"
+#include "session/desktopnotifier.h"
+#include "session/notify.h"
+#include "system/loginname.h"
 
 #include <QDBusConnection>
 #include <QDBusError>
 #include <QDebug>
-#include <QTimer>
 
 namespace
 {
-
-/// When scenes that did not come are asked for again: about as often as the unread messages.
-constexpr int kScenesAgainEarliestMs = 60000;
-constexpr int kScenesAgainLatestMs = 180000;
 
 /// Whether a message pushed to `username` is for the session's user; one that names nobody is for everybody.
 bool isForSessionUser(const QString& username)
@@ -35,7 +30,6 @@ bool isForSessionUser(const QString& username)
 SessionHost::SessionHost(MainWindow& window, QObject* parent)
     : QObject(parent), m_window(window), m_notification(new Notification(this)), m_notifier(new DesktopNotifier(this))
 {
-    showTrayIconWhenHosted();
     askScenesAfterOrganisation();
     showPushedMessages();
     createIntegrityDialog();
@@ -66,8 +60,7 @@ void SessionHost::exportOnSessionBus()
     exportObject(zent::dbus::kFullzonePath, m_integrityDialog.get());
     QDBusConnection bus = QDBusConnection::sessionBus();
     if (!bus.registerService(zent::dbus::kClientService))
-        qWarning() << "SessionHost"
-                   << "cannot own" << zent::dbus::kClientService << bus.lastError().message();
+        qWarning() << "SessionHost cannot own" << zent::dbus::kClientService << bus.lastError().message();
 }
 
 void SessionHost::exportObject(const QString& path, QObject* object)
@@ -76,8 +69,7 @@ void SessionHost::exportObject(const QString& path, QObject* object)
     constexpr auto kOwnMembers = QDBusConnection::ExportScriptableSlots | QDBusConnection::ExportScriptableSignals;
     QDBusConnection bus = QDBusConnection::sessionBus();
     if (!bus.registerObject(path, object, kOwnMembers))
-        qWarning() << "SessionHost"
-                   << "cannot export" << path << bus.lastError().message();
+        qWarning() << "SessionHost cannot export" << path << bus.lastError().message();
 }
 
 void SessionHost::showPushedMessages()
@@ -87,8 +79,7 @@ void SessionHost::showPushedMessages()
                 if (isForSessionUser(username))
                     m_notifier->notify(title, sender, message);
                 else
-                    qInfo() << "SessionHost"
-                            << "message for another user not shown";
+                    qInfo() << "SessionHost message for another user not shown";
             });
     connect(m_notifier, &DesktopNotifier::activated, &m_window, &MainWindow::openNotice);
     connect(m_notifier, &DesktopNotifier::unavailable, this, &SessionHost::showAsBalloon);
@@ -97,19 +88,7 @@ void SessionHost::showPushedMessages()
 void SessionHost::showAsBalloon(const QString& title, const QString& sender, const QString& text)
 {
     if (!m_window.showTrayBalloon(title, DesktopNotifier::body(sender, text)))
-        qWarning() << "SessionHost"
-                   << "neither a notification service nor a tray shows the message";
-}
-
-void SessionHost::showTrayIconWhenHosted()
-{
-    if (m_window.hasSystemTrayIcon())
-        return;
-    auto* watch = new TrayHostWatch(this);
-    connect(watch, &TrayHostWatch::hostAppeared, this, [this, watch] {
-        watch->deleteLater();
-        m_window.showSystemTrayIcon();
-    });
+        qWarning() << "SessionHost neither a notification service nor a tray shows the message";
 }
 
 void SessionHost::askScenesAfterOrganisation()
@@ -123,10 +102,4 @@ void SessionHost::askScenesAfterOrganisation()
             disconnect(m_organisationConnection);
             m_window.getAllUserEnvironment();
         });
-    auto* again = new QTimer(this);
-    again->setObjectName(QStringLiteral("scenesAgain"));
-    again->setSingleShot(true);
-    connect(again, &QTimer::timeout, &m_window, &MainWindow::getAllUserEnvironment);
-    connect(&m_window, &MainWindow::scenesNotKnown, again,
-            [this, again] { again->start(m_window.generateRandnum(kScenesAgainLatestMs, kScenesAgainEarliestMs)); });
 }

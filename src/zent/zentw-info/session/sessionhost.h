@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 #include <QMetaObject>
@@ -11,9 +12,9 @@ class MainWindow;
 class Notification;
 class resumeDialog;
 
-/// What the desktop session wires to the main window beyond what the classes do among themselves: the client's objects
-/// on the session bus, desktop notifications for pushed messages, and the wait for a tray host. A bus that is missing
-/// or a name that is taken is a warning in the log, never a failed start.
+/// Connects the main window with the desktop session: the client's objects on the session bus, and desktop
+/// notifications for pushed messages. It also has the scenes requested after the organisation. A bus that is missing or
+/// a name that is taken is a warning in the log, never a failed start.
 class SessionHost : public QObject
 {
     Q_OBJECT
@@ -24,7 +25,6 @@ public:
     ~SessionHost() override;
 
 private:
-    void showTrayIconWhenHosted();
     void askScenesAfterOrganisation();
     void createIntegrityDialog();
     void exportOnSessionBus();

@@ -1,8 +1,9 @@
-#include "gates.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "startup/gates.h"
 
-#include "filecontent.h"
-#include "idcommand.h"
 #include "paths.h"
+#include "system/idcommand.h"
+#include "terminalinfo.h"
 
 #include <QDebug>
 #include <QFile>
@@ -10,10 +11,10 @@
 
 bool isDomain()
 {
-    QFile file(zent::kUserinfoPath);
-    if (!file.exists() || !file.open(QIODevice::ReadOnly | QIODevice::Text))
+    const zent::base::FileReading info = zent::base::readTerminalInfo();
+    if (!info.opened)
         return false;
-    if (zent::saysInDomain(file.readAll()))
+    if (zent::saysInDomain(info.content))
         return true;
     qInfo() << "is not Domain!";
     return false;

@@ -1,4 +1,5 @@
-#include "log.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "startup/log.h"
 
 #include <QByteArray>
 #include <QDateTime>
@@ -30,12 +31,12 @@ Severity severityOf(QtMsgType type)
     case QtWarningMsg:
         return {"warning", LOG_WARNING};
     case QtCriticalMsg:
-        // More urgent than a fatal message: alarms at the sites are tuned to this order.
+        // More urgent than a fatal message, as agreed.
         return {"critical", LOG_CRIT};
     case QtFatalMsg:
         break;
     }
-    // Four letters, as log filters in the field look for this word.
+    // Four letters, as agreed.
     return {"fata", LOG_ERR};
 }
 
@@ -50,9 +51,9 @@ QByteArray bareFileName(const char* path)
 
 void uOpenlog(LEVEL level)
 {
-    // syslog keeps the pointer, so the text must live as long as the process.
-    static const QByteArray identity =
-        QFileInfo(QFileInfo(QStringLiteral("/proc/self/exe")).symLinkTarget()).fileName().toLatin1();
+    // syslog keeps the pointer, and what is destroyed at the very end may still log: the text is never destroyed.
+    static const auto& identity =
+        *new QByteArray(QFileInfo(QFileInfo(QStringLiteral("/proc/self/exe")).symLinkTarget()).fileName().toLatin1());
 
     QLoggingCategory::defaultCategory()->setEnabled(QtDebugMsg, level == LEVEL_DEBUG);
     currentLevel = level;
@@ -65,15 +66,21 @@ void uCloselog()
     closelog();
 }
 
+QByteArray logRecord(QtMsgType type, const QMessageLogContext& context, const QString& message)
+{
+    QByteArray record(severityOf(type).word);
+    record.append(" [ ").append(bareFileName(context.file)).append(' ').append(context.function);
+    record.append(' ').append(QByteArray::number(static_cast<unsigned int>(context.line))).append("]  ");
+    return record.append(message.toLocal8Bit().constData()).append(" \n");
+}
+
 void uSyslogMessageHandler(QtMsgType type, const QMessageLogContext& context, const QString& message)
 {
     const Severity severity = severityOf(type);
     if (severity.priority > currentLevel)
         return;
     const QByteArray time = QDateTime::currentDateTime().toString(QStringLiteral("yyyy-MM-dd hh:mm:ss.zzz")).toLatin1();
-    syslog(severity.priority, "%s %s [ %s %s %u]  %s \n", time.constData(), severity.word,
-           bareFileName(context.file).constData(), context.function ? context.function : "",
-           static_cast<unsigned int>(context.line), message.toLocal8Bit().constData());
+    syslog(severity.priority, "%s %s", time.constData(), logRecord(type, context, message).constData());
 }
 
 } // namespace zent

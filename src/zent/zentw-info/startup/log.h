@@ -1,5 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <QByteArray>
 #include <QString>
 #include <QtGlobal>
 
@@ -24,6 +26,9 @@ void uOpenlog(LEVEL level);
 
 /// Closes the system log.
 void uCloselog();
+
+/// What the system log says of a Qt message, without the time; a message ends at its first NUL.
+QByteArray logRecord(QtMsgType type, const QMessageLogContext& context, const QString& message);
 
 /// Writes one Qt message as one syslog record. May be called from any thread; a fatal message is only logged.
 void uSyslogMessageHandler(QtMsgType type, const QMessageLogContext& context, const QString& message);

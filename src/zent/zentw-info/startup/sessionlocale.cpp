@@ -1,4 +1,5 @@
-#include "sessionlocale.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "startup/sessionlocale.h"
 
 #include <clocale>
 

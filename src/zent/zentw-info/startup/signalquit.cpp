@@ -1,4 +1,5 @@
-#include "signalquit.h"
+// SPDX-License-Identifier: Apache-2.0
+#include "startup/signalquit.h"
 
 #include <QCoreApplication>
 #include <QDebug>
@@ -29,15 +30,13 @@ void onSignal(int)
 SignalQuit::SignalQuit(QObject* parent) : QObject(parent)
 {
     if (pipe2(pipeEnds, O_CLOEXEC | O_NONBLOCK) != 0) {
-        qWarning() << "SignalQuit"
-                   << "no pipe, termination signals end the process at once";
+        qWarning() << "SignalQuit no pipe, termination signals end the process at once";
         return;
     }
     m_notifier = new QSocketNotifier(pipeEnds[0], QSocketNotifier::Read, this);
     connect(m_notifier, &QSocketNotifier::activated, this, [this] {
         m_notifier->setEnabled(false);
-        qInfo() << "SignalQuit"
-                << "termination signal, quitting";
+        qInfo() << "SignalQuit termination signal, quitting";
         QCoreApplication::quit();
     });
     struct sigaction action = {};

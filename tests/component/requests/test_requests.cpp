@@ -1,0 +1,225 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "fileconfig.h"
+#include "fixture.h"
+#include "httprequest.h"
+#include "notification.h"
+#include "paths.h"
+#include "platformcontrol.h"
+#include "timelimits.h"
+
+#include <QRegularExpression>
+
+namespace
+{
+
+const QString kName = QStringLiteral("张 三&x=1");
+const QString kPassword = QStringLiteral("Pass\"word\\ 密");
+
+/// The status and reply that no server would give by itself.
+const QJsonObject kReply{{"status", 207}, {"body", QStringLiteral("die Antwort 答复")}};
+
+} // namespace
+
+/// Every request of the management and the notification service, byte for byte, and what is made of the replies.
+class TestRequests : public QObject
+{
+    Q_OBJECT
+
+    PlatformControl m_platform;
+    HttpRequest* m_server = HttpRequest::GetInstance();
+    std::unique_ptr<QNotification> m_messages;
+    /// Name, status and text of each signal since the last call.
+    QJsonArray m_signals;
+
+    const QMap<QString, std::function<void()>> m_calls = {
+        {"getCaCert", [this] { m_server->getCaCert("server.zent.test", "80"); }},
+        {"getMacheineCheck join", [this] { m_server->getMacheineCheck(MachineState::Join, kName); }},
+        {"getMacheineCheck remove", [this] { m_server->getMacheineCheck(MachineState::Remove, kName); }},
+        {"getMacheineCheck other", [this] { m_server->getMacheineCheck(static_cast<MachineState>(2), kName); }},
+        {"postCheckAccountPwd", [this] { m_server->postCheckAccountPwd(kName, kPassword); }},
+        {"postJoinControl", [this] { m_server->postJoinControl(kName); }},
+        {"postQuitControl", [this] { m_server->postQuitControl(kName); }},
+        {"postRemoveStatus", [this] { m_server->postRemoveStatus(kName, kPassword); }},
+        {"getCompanyName", [this] { m_server->getCompanyName(); }},
+        {"getUserInfo", [this] { m_server->getUserInfo(kName); }},
+        {"getNotifyMessageList defaults", [this] { m_messages->getNotifyMessageList(NotifyMessageOption(), {}); }},
+        {"getNotifyMessageList option",
+         [this] {
+             m_messages->getNotifyMessageList({kName, true, 7, 5, "a+b", "0"}, {});
+         }},
+        {"getNotifyMessageList page 0", [this] { m_messages->getNotifyMessageList(kName, true, 0, 20, {}); }},
+        {"getNotifyMessageList page 1", [this] { m_messages->getNotifyMessageList(kName, true, 1, 20, {}); }},
+        {"getNotifyMessageList page 3", [this] { m_messages->getNotifyMessageList(kName, false, 3, 20, {}); }},
+        {"readNotifyMessage", [this] { m_messages->readNotifyMessage("u\"1", {}); }},
+        {"readAllNotifyMessage", [this] { m_messages->readAllNotifyMessage(kName, {}); }},
+    };
+
+    template <typename Signal>
+    void note(const char* name, Signal signal)
+    {
+        connect(m_server, signal, this, [this, name](const int& status, const QString& text) {
+            m_signals.append(QString("%1 %2 %3").arg(name).arg(status).arg(text));
+        });
+    }
+    /// Of the recorded request, what the expected one names; a time stamp of these seconds is replaced by a word.
+    static QJsonObject comparable(const QJsonObject& recorded, const QJsonObject& expected)
+    {
+        QJsonObject request;
+        for (const QString& key : expected.keys())
+            request[key] = recorded[key];
+        QJsonObject headers;
+        for (const QString& key : expected["headers"].toObject().keys())
+            headers[key] = recorded["headers"].toObject().value(key).toString();
+        request["headers"] = headers;
+        QString query = recorded["raw_query"].toString();
+        static const QRegularExpression stamp("(?<=timestaps=)\\d+$");
+        if (qAbs(stamp.match(query).captured().toLongLong() - QDateTime::currentSecsSinceEpoch()) < 30)
+            query.replace(stamp, "NOW");
+        request["raw_query"] = query;
+        return request;
+    }
+
+private slots:
+    void initTestCase()
+    {
+        note("sigCaCert", &HttpRequest::sigCaCert);
+        note("sigMacheineCheck", &HttpRequest::sigMacheineCheck);
+        note("sigCheckAccountPwd", &HttpRequest::sigCheckAccountPwd);
+        note("sigJoinControl", &HttpRequest::sigJoinControl);
+        note("sigQuitControl", &HttpRequest::sigQuitControl);
+        note("sigRemoveStatus", &HttpRequest::sigRemoveStatus);
+        note("sigCompanyName", &HttpRequest::sigCompanyName);
+        note("sigUserInfo", &HttpRequest::sigUserInfo);
+        testfiles::write(zent::kMachineidPath, " M 1&2\n");
+        testfiles::write(zent::kUserinfoPath, R"({"protocol": "https", "server_host": "server.zent.test",
+            "server_port": 80, "notificition_prefix": "/box/v9", "token": "to ken"})");
+        m_messages = std::make_unique<QNotification>();
+        FileConfig* config = FileConfig::GetInstance();
+        config->setServerHost("server.zent.test");
+        config->setServerPort("443");
+        config->setDomainHost("domain.zent.test");
+        config->setDomainPort("80");
+        config->setTerminalName(QStringLiteral("终端 1"));
+    }
+
+    void requests_data() { fixture::addRows("requests.json"); }
+    void requests()
+    {
+        QFETCH(QJsonObject, row);
+        const QJsonObject expected = row["request"].toObject();
+        m_platform.clearFaults();
+        m_platform.addFault({{"path", "*"}}, kReply);
+        m_platform.clearRecord();
+        m_signals = {};
+        const LogCapture log;
+        const auto call = m_calls.value(QTest::currentDataTag());
+        QVERIFY2(call, "no call of that name");
+        const int limits = singleShots(30000);
+        call();
+        // What nobody waits for ends by itself.
+        QCOMPARE(singleShots(30000) - limits, m_messages->pendingRequests());
+        QList<QJsonObject> sent;
+        QTRY_VERIFY(!(sent = m_platform.record("http")).isEmpty());
+        QCOMPARE(sent.size(), 1);
+        fixture::compare(comparable(sent.first(), expected), expected);
+        QJsonArray signalled;
+        if (row.contains("signal"))
+            signalled.append(QString("%1 207 %2").arg(row["signal"].toString(), kReply["body"].toString()));
+        fixture::compare(m_signals, signalled);
+        fixture::compareLog(log, row["log"]);
+        QTRY_COMPARE(m_messages->pendingRequests(), 0);
+    }
+    void everyRequestHasARow() { QCOMPARE(fixture::read("requests.json").keys(), m_calls.keys()); }
+
+    void messageLists_data() { fixture::addRows("messagelists.json"); }
+    void messageLists()
+    {
+        QFETCH(QJsonObject, row);
+        m_platform.clearFaults();
+        m_platform.addFault({{"path", "*"}}, row["reply"].toObject());
+        QJsonObject got;
+        NotifyMessageOption option;
+        option.is_not_read = row["is_not_read"].toBool();
+        const LogCapture log;
+        m_messages->getNotifyMessageList(option, [&got](bool ok, const NotifyMessageResponse& response) {
+            QJsonArray messages;
+            for (const NotifyMessage& m : response.messages)
+                messages.append(QJsonArray{m.uuid, m.uid, m.send_uid, m.title, m.content, m.created_at, m.read_at});
+            got = {{"ok", ok},
+                   {"total", response.total},
+                   {"limit", response.limit},
+                   {"offset", response.offset},
+                   {"is_not_read", response.is_not_read},
+                   {"messages", messages}};
+        });
+        QTRY_VERIFY(!got.isEmpty());
+        fixture::compare(got, row["got"]);
+        fixture::compareLog(log, row["log"]);
+    }
+
+    void readReplies()
+    {
+        for (const bool good : {true, false}) {
+            m_platform.clearFaults();
+            m_platform.addFault({{"path", "*"}}, {{"status", good ? 200 : 201}, {"body", "{}"}});
+            const LogCapture log;
+            QList<bool> results;
+            const auto done = [&results](bool ok, const QString&) { results.append(ok); };
+            m_messages->readNotifyMessage("1", done);
+            m_messages->readAllNotifyMessage("1", done);
+            QTRY_COMPARE(results, QList<bool>({good, good}));
+            for (const char* path : {"read", "read_all"}) {
+                const QString line =
+                    QString("PUT \"https://server.zent.test:80/box/v9/%1\" failed: status 201").arg(path);
+                QCOMPARE(log.count(line), good ? 0 : 1);
+            }
+        }
+    }
+
+    void texts()
+    {
+        const QMap<int, QString> numbers{{-1, "-1"}, {0, "0"}, {98, "98"}, {99, "99"}, {100, "..."}, {1000, "..."}};
+        for (auto row = numbers.begin(); row != numbers.end(); ++row)
+            QCOMPARE(QNotification::formatUnReadNumber(row.key()), row.value());
+        const QString shown = QNotification::getCurrentTime();
+        const QDateTime time = QDateTime::fromString(shown, "yyyy-MM-dd hh:mm:ss");
+        QVERIFY2(time.isValid() && qAbs(time.secsTo(QDateTime::currentDateTime())) < 30, qPrintable(shown));
+    }
+
+    void names_data() { fixture::addRows("names.json"); }
+    void names()
+    {
+        QFETCH(QJsonObject, row);
+        m_platform.clearFaults();
+        m_platform.addFault({{"path", "*/config"}}, row["rule"].toObject());
+        m_platform.addFault({{"path", "*/verify/name"}}, row["verdict"].toObject());
+        m_server->getCaCert("server.zent.test", "80");
+        m_platform.clearRecord();
+        const LogCapture log;
+        QString message;
+        QCOMPARE(m_server->checkPcName(row["name"].toString("ab 1"), message), row["accepted"].toBool());
+        QCOMPARE(message, row["message"].toString());
+        QJsonArray sent;
+        for (const QJsonObject& request : m_platform.record("http"))
+            sent.append(request["headers"].toObject()["host"].toString() + request["path"].toString() + '?' +
+                        request["raw_query"].toString());
+        fixture::compare(sent, row["sent"]);
+        fixture::compareLog(log, row["log"]);
+    }
+
+    void macAddress_data() { fixture::addRows("connections.json"); }
+    void macAddress()
+    {
+        QFETCH(QJsonObject, row);
+        m_platform.clearFaults();
+        if (row.contains("fault"))
+            m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}}, row["fault"].toObject());
+        m_platform.patchState({{"connections", row["connections"]}});
+        const LogCapture log;
+        QCOMPARE(FileConfig::GetInstance()->getMacAddress(), row["mac"].toString());
+        QCOMPARE(log.contains("GetActiveConnectionInfo error"), row.contains("fault"));
+    }
+};
+
+QTEST_GUILESS_MAIN(TestRequests)
+#include "test_requests.moc"

@@ -1,0 +1,184 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "account.h"
+#include "closeguarddialog.h"
+#include "fixture.h"
+#include "iconbutton.h"
+#include "infowidget.h"
+#include "mainwindow.h"
+#include "modifydialog.h"
+#include "noticedialog.h"
+#include "notification.h"
+#include "paths.h"
+#include "resumedialog.h"
+#include "spinerwin.h"
+
+#include <QAbstractButton>
+#include <QLayout>
+#include <QRegularExpression>
+
+/// The names, texts and sizes of each window's widgets, read from the widgets, and what the windows log when used.
+class TestWindows : public QObject
+{
+    Q_OBJECT
+
+    /// A size that is fixed, or its bounds where it has any; the rest is the font's and the layout's.
+    static QString bounds(int least, int most)
+    {
+        if (least == most)
+            return QString::number(least);
+        return (least > 0 ? QString::number(least) : "") + '-' + (most < QWIDGETSIZE_MAX ? QString::number(most) : "");
+    }
+
+    /// What a layout leaves around and between its items.
+    static QString spaces(const QLayout* layout)
+    {
+        const QMargins margins = layout->contentsMargins();
+        return QString(" layout %1,%2,%3,%4 %5")
+            .arg(margins.left())
+            .arg(margins.top())
+            .arg(margins.right())
+            .arg(margins.bottom())
+            .arg(layout->spacing());
+    }
+
+    /// The value as text, with an asterisk for what the present time gives.
+    static QString withoutDate(const QWidget* widget, const QVariant& value)
+    {
+        QString text = fixture::text(QJsonValue::fromVariant(value));
+        static const QStringList kDates{"dateTimeLabel", "CdateTimeLabel", "loginValue"};
+        if (value.type() != QVariant::String || !kDates.contains(widget->objectName()))
+            return text;
+        return text.replace(QRegularExpression("\\d+|星期.|..年.*月.."), "*");
+    }
+
+    static QString describe(const QWidget* widget, const QWidget* window)
+    {
+        QString line = QString("%1 \"%2\"").arg(widget->metaObject()->className(), widget->objectName());
+        line += QString(" %1x%2").arg(bounds(widget->minimumWidth(), widget->maximumWidth()),
+                                      bounds(widget->minimumHeight(), widget->maximumHeight()));
+        if (widget != window && !widget->parentWidget()->layout())
+            line += QString(" at %1,%2").arg(widget->x()).arg(widget->y());
+        if (widget->layout())
+            line += spaces(widget->layout());
+        for (const char* property : {"windowTitle", "accessibleName", "text", "placeholderText", "alignment",
+                                     "echoMode", "readOnly", "default"}) {
+            const QVariant value = widget->property(property);
+            if (value.isValid() && value != QVariant(QString()))
+                line += QString(" %1=%2").arg(property, withoutDate(widget, value));
+        }
+        if (const auto* button = qobject_cast<const QAbstractButton*>(widget))
+            line += QString(" icon %1 %2").arg(button->iconSize().width()).arg(!button->icon().isNull());
+        const QPair<bool, const char*> states[] = {{!widget->isVisibleTo(window), " hidden"},
+                                                   {!widget->isEnabled(), " disabled"},
+                                                   {widget->isModal(), " modal"},
+                                                   {(widget->focusPolicy() & Qt::TabFocus) != 0, " tab"}};
+        for (const auto& [holds, word] : states)
+            line += holds ? word : "";
+        return line;
+    }
+
+    static QWidget* make(const QString& name)
+    {
+        if (name.startsWith("panel")) {
+            auto* panel = new InfoWidget(nullptr, name.endsWith("administrator"));
+            panel->setSceneBox(name.endsWith("administrator"));
+            return panel;
+        }
+        if (name == "icon button")
+            return new IconButton(nullptr);
+        if (name == "password")
+            return new ModifyDialog;
+        if (name == "message")
+            return new NoticeDialog("zhangsan", nullptr);
+        if (name == "verification")
+            return new resumeDialog;
+        if (name == "release")
+            return new closeGuarddialog;
+        auto* progress = new spinerWin;
+        if (name == "released")
+            progress->onRemoveController();
+        return progress;
+    }
+
+    static void useAccount()
+    {
+        Account account;
+        account.getUserName();
+        account.isScenceUser();
+        for (const char* text : {R"({"code": 0, "data": {"user": {"id": 7, "gecos": "A,b,c,1", "client_name": "PC"}}})",
+                                 R"({"code": 0, "data": [{"name": "O"}]})", R"({"code": 1})", "{"}) {
+            QByteArray body = text;
+            account.analyseData(&body);
+            account.analyseAreaData(&body);
+        }
+        account.onUserInfo(404, "{");
+        account.onCompanyName(404, "{");
+    }
+
+    static void useWindow(int version)
+    {
+        MainWindow window(nullptr, version);
+        window.onActivatedSysTrayIcon(QSystemTrayIcon::Trigger);
+        window.close();
+        window.readScriptsFile("/none");
+        QByteArray refusal = R"({"code": 1})";
+        window.analyseEvnData(&refusal);
+        window.callloadpolicy(2, "code");
+        window.findChild<QAbstractButton*>("NetInfo")->click();
+    }
+
+    static void useDialogs()
+    {
+        resumeDialog verification;
+        verification.setIpPort("server", "");
+        verification.Notify("text", "/fix");
+        verification.hideWindow();
+        verification.close();
+        verification.Notify("success", "/fix");
+        verification.close();
+        spinerWin().close();
+        closeGuarddialog release;
+        release.setUsrname("zhangsan");
+        release.getMachineId();
+        ModifyDialog().onRestoreFinishedprocess();
+    }
+
+private slots:
+    void initTestCase()
+    {
+        QNotification::qInstance = new QNotification;
+        testfiles::remove(zent::kMachineidPath);
+    }
+
+    void widgets_data() { fixture::addRows("windows.json"); }
+    void widgets()
+    {
+        QFETCH(QJsonObject, row);
+        const std::unique_ptr<QWidget> window(make(QTest::currentDataTag()));
+        QStringList got{describe(window.get(), window.get())};
+        for (const QWidget* widget : window->findChildren<QWidget*>())
+            got.append(describe(widget, window.get()));
+        QStringList expected = row["widgets"].toVariant().toStringList();
+        QCOMPARE(got.size(), expected.size());
+        for (int i = 0; i < got.size(); ++i)
+            QCOMPARE(got[i], expected[i]);
+    }
+
+    void logLines_data() { fixture::addRows("windowlogs.json"); }
+    void logLines()
+    {
+        QFETCH(QJsonObject, row);
+        const std::map<QString, std::function<void()>> uses{{"account", useAccount},
+                                                            {"window", [] { useWindow(1020); }},
+                                                            {"newer window", [] { useWindow(1030); }},
+                                                            {"dialogs", useDialogs}};
+        const LogCapture log;
+        uses.at(QTest::currentDataTag())();
+        const QStringList lines = log.lines();
+        for (const QJsonValue& line : row["log"].toArray())
+            QVERIFY2(lines.contains(line.toString()), qPrintable(line.toString() + "\n\n" + lines.join('\n')));
+    }
+};
+
+QTEST_MAIN(TestWindows)
+#include "test_windows.moc"

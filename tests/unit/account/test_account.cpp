@@ -1,0 +1,127 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "account.h"
+#include "fixture.h"
+#include "httprequest.h"
+#include "logcapture.h"
+#include "loginname.h"
+#include "platformcontrol.h"
+#include "testfiles.h"
+
+#include <QSignalSpy>
+#include <QtTest>
+
+#include <dlfcn.h>
+#include <pwd.h>
+
+static int s_lookups = 0;
+
+/// Stands before the one of the C library, and counts.
+extern "C" passwd* getpwuid(uid_t uid)
+{
+    ++s_lookups;
+    static const auto next = reinterpret_cast<decltype(&getpwuid)>(dlsym(RTLD_NEXT, "getpwuid"));
+    return next(uid);
+}
+
+class TestAccount : public QObject
+{
+    Q_OBJECT
+
+    PlatformControl m_platform;
+    QList<QPair<int, int>> m_intervals;
+
+    /// Takes down the interval asked for and makes it short.
+    zent::RandomInterval soon()
+    {
+        return [this](int latest, int earliest) {
+            m_intervals.append({latest, earliest});
+            return 50;
+        };
+    }
+
+private slots:
+    void cleanup()
+    {
+        m_platform.clearFaults();
+        m_intervals.clear();
+    }
+
+    void theLoginNameIsLookedUpOnce()
+    {
+        Account account(nullptr, soon());
+        for (int poll = 0; poll < 3; ++poll)
+            account.getusrInfo();
+        QCOMPARE(sessionLoginName(), QString("zhangsan"));
+        QCOMPARE(s_lookups, 1);
+    }
+
+    void pollingEndsWithTheFirstGoodAnswer()
+    {
+        for (const char* path : {"account", "uim_department/id"})
+            m_platform.addFault({{"path", QString("/uim/v3/client/") + path}}, {{"body", R"({"code": 1})"}});
+        Account account(nullptr, soon());
+        account.start();
+        HttpRequest* client = HttpRequest::GetInstance();
+        QSignalSpy users(client, &HttpRequest::sigUserInfo);
+        QSignalSpy organisations(client, &HttpRequest::sigCompanyName);
+        QSignalSpy userChanges(&account, &Account::userChanged);
+        QSignalSpy organisationChanges(&account, &Account::organisationChanged);
+        QTRY_VERIFY_WITH_TIMEOUT(users.count() >= 2, 20000);
+        QVERIFY(userChanges.isEmpty() && account.loginInfo().personName.isEmpty());
+        // The body alone decides.
+        client->onUserInfo(500, R"({"code": 0, "data": {"user": {"gecos": "A,,,1", "client_name": "PC", "id": 7}}})");
+        QCOMPARE(userChanges.count(), 1);
+        const int asked = users.count();
+        // The other question, which is still open, is asked more rarely than this one was.
+        const int before = organisations.count();
+        QTRY_VERIFY_WITH_TIMEOUT(organisations.count() >= before + 2, 20000);
+        QCOMPARE(users.count(), asked);
+        QVERIFY(organisationChanges.isEmpty());
+        client->onCompanyName(500, R"({"code": 0, "data": {"name": "O"}})");
+        QCOMPARE(organisationChanges.count(), 1);
+        // A later bad answer takes nothing away.
+        client->onUserInfo(200, R"({"code": 1})");
+        const TLoginInfo info = account.loginInfo();
+        QCOMPARE(info.terminalAlias + info.organizationName + info.personName + info.jobNumber, QString("PCOA1"));
+        QCOMPARE(account.id(), 7);
+        QVERIFY(m_intervals.isEmpty());
+    }
+
+    void otherReplies_data() { fixture::addRows("accountreplies.json"); }
+    void otherReplies()
+    {
+        QFETCH(QJsonObject, row);
+        m_platform.addFault({{"path", "/any"}}, row["reply"].toObject());
+        Account account(nullptr, soon());
+        QJsonArray told;
+        connect(&account, &Account::userChanged, [&] { told.append("user " + account.loginInfo().personName); });
+        connect(&account, &Account::organisationChanged,
+                [&] { told.append("organisation " + account.loginInfo().organizationName); });
+        connect(&account, &Account::areaKnown, [&] { told.append("area"); });
+        connect(&account, &Account::areaFailed, [&] { told.append("failed"); });
+        QNetworkAccessManager manager;
+        QSignalSpy finished(&manager, &QNetworkAccessManager::finished);
+        QNetworkReply* reply = manager.get(QNetworkRequest(QUrl("http://server.zent.test/any")));
+        QTRY_COMPARE(finished.count(), 1);
+        row["of"] == "area" ? account.rcvAreainfoData(reply) : account.analysejson(reply);
+        fixture::compare(told, row["told"]);
+        QCOMPARE(m_intervals.size(), row["refreshed"].toBool() ? 1 : 0);
+        QVERIFY(m_intervals.isEmpty() || m_intervals.first() == qMakePair(900000, 600000));
+    }
+
+    void administrators()
+    {
+        const QString file = qEnvironmentVariable("ROOM") + "/standin/id.stdout";
+        for (const char* groups : {"1(sudo),2(my-zent)", "1(sudo)", "2(zent)", ""}) {
+            testfiles::write(file, groups);
+            Account account;
+            // The first answer comes from the run that was started early, the second from one of its own.
+            for (int i = 0; i < 2; ++i)
+                QCOMPARE(account.isAdminUser(), QString(groups).contains(','));
+        }
+        QFile::remove(file);
+    }
+};
+
+QTEST_GUILESS_MAIN(TestAccount)
+#include "test_account.moc"
