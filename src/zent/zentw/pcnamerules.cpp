@@ -138,8 +138,9 @@ QString withoutSlashes(const QString& rule)
 bool isBearableRule(const QString& rule)
 {
     // An escaped character, a class, the beginning of a group, a counted repetition, or any one character.
+    // QRegExp repeats before it misses the "}" of a count.
     static const QRegularExpression kToken(
-        QStringLiteral(R"(\\.|\[\^?(?:\\.|.)(?:\\.|[^\]\\])*\]|\(\?[:=!]|\{(\d*)(?:,(\d*))?\}|.)"),
+        QStringLiteral(R"(\\.|\[\^?(?:\\.|.)(?:\\.|[^\]\\])*\]|\(\?[:=!]|\{(\d*)(?:,(\d*))?\}?|.)"),
         QRegularExpression::DotMatchesEverythingOption);
     if (rule.size() > kMost.characters)
         return false;
