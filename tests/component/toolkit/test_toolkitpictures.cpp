@@ -1,0 +1,199 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "fixture.h"
+#include "themehelper.h"
+#include "toolkitblurframe.h"
+#include "toolkitbuttonbox.h"
+#include "toolkitcombobox.h"
+#include "toolkitdialog.h"
+#include "toolkitframe.h"
+#include "toolkitpasswordedit.h"
+#include "toolkitspinner.h"
+#include "toolkitsuggestbutton.h"
+#include "toolkittitlebar.h"
+#include "toolkittoolbutton.h"
+#include "toolkitwarningbutton.h"
+
+#include <QMenu>
+#include <QPainter>
+
+#include <functional>
+
+/// What the widgets draw in their states, compared with pictures that were looked at. They hold no text, so that no
+/// font matters. A row's picture shows its states from left to right.
+class TestToolkitPictures : public QObject
+{
+    Q_OBJECT
+
+    static QIcon icon()
+    {
+        QPixmap pixmap(16, 16);
+        pixmap.fill(Qt::transparent);
+        QPainter(&pixmap).fillRect(4, 2, 8, 12, Qt::darkCyan);
+        return pixmap;
+    }
+
+    static QWidget* segments(QWidget* parent)
+    {
+        auto* box = new ToolkitButtonBox(parent);
+        for (int number = 0; number < 2; ++number)
+            box->addButton(new ToolkitButtonBoxButton("", box));
+        box->buttonList().constFirst()->setChecked(true);
+        return box;
+    }
+
+    static QWidget* titlebar(QWidget* parent)
+    {
+        auto* bar = new ToolkitTitlebar(parent);
+        bar->setIcon(icon());
+        bar->setMenu(new QMenu(bar));
+        return bar;
+    }
+
+    static QWidget* make(const QString& kind, QWidget* parent)
+    {
+        static const std::map<QString, std::function<QWidget*(QWidget*)>> kMakers{
+            {"push button", [](QWidget* parent) { return new ToolkitPushButton(parent); }},
+            {"suggest button", [](QWidget* parent) { return new ToolkitSuggestButton("", parent); }},
+            {"warning button", [](QWidget* parent) { return new ToolkitWarningButton("", parent); }},
+            {"tool button", [](QWidget* parent) { return new ToolkitToolButton(parent); }},
+            {"segments", segments},
+            {"segment", [](QWidget* parent) { return new ToolkitButtonBoxButton("", parent); }},
+            {"combo box", [](QWidget* parent) { return new ToolkitComboBox(parent); }},
+            {"line edit", [](QWidget* parent) { return new ToolkitLineEdit(parent); }},
+            {"password edit", [](QWidget* parent) { return new ToolkitPasswordEdit(parent); }},
+            {"title bar", titlebar},
+            {"spinner", [](QWidget* parent) { return new ToolkitSpinner(parent); }},
+            {"surface", [](QWidget* parent) { return new ToolkitBlurFrame(parent); }},
+            {"dialog", [](QWidget*) { return new ToolkitDialog; }},
+            {"line", [](QWidget* parent) { return new ToolkitFrame(parent); }},
+        };
+        return kMakers.at(kind)(parent);
+    }
+
+    static void applyToButton(QAbstractButton* button, const QString& word)
+    {
+        if (word == "down")
+            button->setDown(true);
+        else if (word == "checked")
+            button->setChecked(true);
+        else if (word == "icon")
+            button->setIcon(icon());
+        else if (auto* tool = qobject_cast<ToolkitToolButton*>(button))
+            tool->setIconTinted(word == "tinted");
+    }
+
+    /// Puts the widget into a state; one that it cannot have fails the test.
+    static void apply(QWidget* widget, const QString& word)
+    {
+        if (word == "hovered")
+            widget->setAttribute(Qt::WA_UnderMouse);
+        else if (word == "disabled")
+            widget->setEnabled(false);
+        else if (word == "focused")
+            widget->setFocus();
+        else if (word == "upright")
+            qobject_cast<ToolkitFrame*>(widget)->setFrameShape(QFrame::VLine);
+        else if (word == "level")
+            qobject_cast<ToolkitFrame*>(widget)->setFrameShape(QFrame::HLine);
+        else if (word == "alert")
+            qobject_cast<ToolkitLineEdit*>(widget)->setAlert(true);
+        else if (word == "filled")
+            qobject_cast<ToolkitPasswordEdit*>(widget)->setClearIcon(icon());
+        else if (word == "sought")
+            widget->findChild<QAbstractButton*>("echoButton")->setChecked(true);
+        else if (word == "playing")
+            qobject_cast<ToolkitSpinner*>(widget)->start();
+        else if (word == "turned")
+            QMetaObject::invokeMethod(widget->findChild<QTimer*>(), "timeout");
+        else if (word == "clear")
+            qobject_cast<ToolkitBlurFrame*>(widget)->setMaskAlpha(99);
+        else if (word == "sharp")
+            qobject_cast<ToolkitBlurFrame*>(widget)->setRadius(4);
+        else if (word == "night")
+            qobject_cast<ToolkitBlurFrame*>(widget)->setMaskColor(Qt::darkBlue);
+        else if (auto* button = qobject_cast<QAbstractButton*>(widget))
+            applyToButton(button, word);
+    }
+
+    /// The widget in the state that the words say, in a light window or a dark one.
+    static QImage picture(const QString& kind, const QSize& size, const QStringList& words)
+    {
+        QWidget window;
+        window.setPalette(
+            ThemeHelper::palette(words.contains("dark") ? ThemeHelper::DarkType : ThemeHelper::LightType));
+        window.resize(size);
+        const std::unique_ptr<QWidget> widget(make(kind, &window));
+        widget->resize(size);
+        window.show();
+        if (!QTest::qWaitForWindowActive(&window))
+            qFatal("no active window");
+        // As after a press of Tab.
+        window.setAttribute(Qt::WA_KeyboardFocusChange);
+        window.setFocus();
+        for (const QString& word : words)
+            apply(widget.get(), word);
+        QImage image(size, QImage::Format_ARGB32_Premultiplied);
+        image.fill(window.palette().color(QPalette::Window));
+        QPainter painter(&image);
+        widget->render(&painter, QPoint(), QRegion(), QWidget::DrawChildren);
+        return image;
+    }
+
+    /// How many pixels differ visibly.
+    static int differences(const QImage& a, const QImage& b)
+    {
+        constexpr int kVisible = 4;
+        int count = 0;
+        for (int y = 0; y < a.height(); ++y) {
+            for (int x = 0; x < a.width(); ++x) {
+                const QColor one = a.pixelColor(x, y);
+                const QColor other = b.pixelColor(x, y);
+                count += std::abs(one.red() - other.red()) > kVisible ||
+                                 std::abs(one.green() - other.green()) > kVisible ||
+                                 std::abs(one.blue() - other.blue()) > kVisible
+                             ? 1
+                             : 0;
+            }
+        }
+        return count;
+    }
+
+private slots:
+    void states_data() { fixture::addRows("pictures.json"); }
+    void states()
+    {
+        QFETCH(QJsonObject, row);
+        const QString kind = QTest::currentDataTag();
+        const QSize size(row["width"].toInt(), row["height"].toInt());
+        const QJsonArray states = row["states"].toArray();
+        QImage strip(size.width() * states.size(), size.height(), QImage::Format_RGB32);
+        QPainter painter(&strip);
+        for (int i = 0; i < states.size(); ++i)
+            painter.drawImage(i * size.width(), 0, picture(kind, size, states[i].toString().split(' ')));
+        painter.end();
+        const QString name = "pictures/" + QString(kind).replace(' ', '-') + ".png";
+        const QImage expected(ZENT_TEST_DATA "/" + name);
+        const QString got = QDir::tempPath() + "/" + QFileInfo(name).fileName();
+        const bool same = expected.size() == strip.size() && differences(strip, expected) == 0;
+        QVERIFY2(same || !strip.save(got), qPrintable("not as in tests/data/" + name + ", but as in " + got));
+    }
+
+    void palettes()
+    {
+        const QJsonObject expected = fixture::read("palettes.json");
+        const auto roles = QMetaEnum::fromType<QPalette::ColorRole>();
+        const auto groups = QMetaEnum::fromType<QPalette::ColorGroup>();
+        for (const auto type : {ThemeHelper::UnknownType, ThemeHelper::LightType, ThemeHelper::DarkType}) {
+            QJsonObject got;
+            for (const auto group : {QPalette::Active, QPalette::Inactive, QPalette::Disabled}) {
+                for (int role = 0; role < QPalette::NColorRoles; ++role)
+                    got[QString(groups.valueToKey(group)) + ' ' + roles.valueToKey(role)] =
+                        ThemeHelper::palette(type).color(group, QPalette::ColorRole(role)).name();
+            }
+            fixture::compare(got, expected[type == ThemeHelper::DarkType ? "dark" : "light"]);
+        }
+    }
+};
+
+QTEST_MAIN(TestToolkitPictures)
+#include "test_toolkitpictures.moc"
