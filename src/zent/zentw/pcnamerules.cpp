@@ -30,6 +30,8 @@ struct WrittenOut {
 
 /// The steps of a match are bounded by characters × choices × the length of the name.
 constexpr WrittenOut kMost{512, 32, 2};
+/// A reference to a group: QRegExp reads places that it has never written for some, and crashes.
+constexpr WrittenOut kReference{kMost.characters + 1, 0, 0};
 /// What is looked ahead for is searched from many places, so it counts as repeated.
 constexpr int kLookAheadTimes = 16;
 
@@ -81,6 +83,8 @@ WrittenOut readGroup(QRegularExpressionMatchIterator& tokens)
                    (looksAhead ? repeated(group, kLookAheadTimes) : group);
         } else if (text == QLatin1String("|")) {
             last = {0, 1, 0};
+        } else if (text.size() == 2 && text.at(1) >= QLatin1Char('1') && text.at(1) <= QLatin1Char('9')) {
+            last = kReference;
         } else {
             const bool isAnchor = text == QLatin1String("^") || text == QLatin1String("$");
             last = {isAnchor ? 0 : 1, 0, 0};

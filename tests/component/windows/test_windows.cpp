@@ -11,9 +11,10 @@
 #include "paths.h"
 #include "resumedialog.h"
 #include "spinerwin.h"
+#include "themehelper.h"
 
 #include <QAbstractButton>
-#include <QLayout>
+#include <QGridLayout>
 #include <QRegularExpression>
 
 /// The names, texts and sizes of each window's widgets, read from the widgets, and what the windows log when used.
@@ -34,11 +35,54 @@ class TestWindows : public QObject
     {
         const QMargins margins = layout->contentsMargins();
         return QString(" layout %1,%2,%3,%4 %5")
-            .arg(margins.left())
-            .arg(margins.top())
-            .arg(margins.right())
-            .arg(margins.bottom())
-            .arg(layout->spacing());
+                   .arg(margins.left())
+                   .arg(margins.top())
+                   .arg(margins.right())
+                   .arg(margins.bottom())
+                   .arg(layout->spacing()) +
+               items(layout);
+    }
+
+    /// The items of a layout in order, w for a widget, with their stretch and alignment, which windows depend on.
+    static QString items(const QLayout* layout)
+    {
+        QString text;
+        for (int i = 0; i < layout->count(); ++i) {
+            QLayoutItem* item = layout->itemAt(i);
+            text += item->widget() ? " w" : item->layout() ? " (" + spaces(item->layout()) + ")" : " s";
+            if (QSpacerItem* spacer = item->spacerItem())
+                text += QString("%1x%2").arg(spacer->sizeHint().width()).arg(spacer->sizeHint().height());
+            const auto* box = qobject_cast<const QBoxLayout*>(layout);
+            if (box && box->stretch(i) > 0)
+                text += '*' + QString::number(box->stretch(i));
+            if (const auto* grid = qobject_cast<const QGridLayout*>(layout)) {
+                int row = 0, column = 0, rows = 0, columns = 0;
+                grid->getItemPosition(i, &row, &column, &rows, &columns);
+                text += QString("%1,%2").arg(row).arg(column);
+            }
+            if (item->alignment())
+                text += '@' + QString::number(item->alignment());
+        }
+        return text;
+    }
+
+    /// The font that the widget was given, and its colours where they are not those of the light theme.
+    static QString looks(const QWidget* widget)
+    {
+        QString text;
+        const QFont font = widget->testAttribute(Qt::WA_SetFont) ? widget->font() : QApplication::font();
+        if (font.family() != QApplication::font().family())
+            text += QString(" font %1 %2").arg(font.family()).arg(font.pixelSize() > 0 ? 0 : font.pointSize());
+        if (font.pixelSize() > 0 || font.weight() != QFont::Normal)
+            text += QString(" %1px %2").arg(font.pixelSize()).arg(font.weight());
+        static const auto kRoles = QMetaEnum::fromType<QPalette::ColorRole>();
+        static const QPalette kLight = ThemeHelper::palette(ThemeHelper::LightType);
+        for (int role = 0; widget->testAttribute(Qt::WA_SetPalette) && role < QPalette::NColorRoles; ++role) {
+            const QColor color = widget->palette().color(QPalette::ColorRole(role));
+            if (color != kLight.color(QPalette::ColorRole(role)))
+                text += QString(" %1 %2").arg(kRoles.valueToKey(role), color.name(QColor::HexArgb));
+        }
+        return text;
     }
 
     /// The value as text, with an asterisk for what the present time gives.
@@ -60,8 +104,9 @@ class TestWindows : public QObject
             line += QString(" at %1,%2").arg(widget->x()).arg(widget->y());
         if (widget->layout())
             line += spaces(widget->layout());
-        for (const char* property : {"windowTitle", "accessibleName", "text", "placeholderText", "alignment",
-                                     "echoMode", "readOnly", "default"}) {
+        for (const char* property :
+             {"windowTitle", "accessibleName", "text", "placeholderText", "alignment", "echoMode", "readOnly",
+              "default", "styleSheet", "toolTip", "wordWrap", "maxLength"}) {
             const QVariant value = widget->property(property);
             if (value.isValid() && value != QVariant(QString()))
                 line += QString(" %1=%2").arg(property, withoutDate(widget, value));
@@ -74,7 +119,7 @@ class TestWindows : public QObject
                                                    {(widget->focusPolicy() & Qt::TabFocus) != 0, " tab"}};
         for (const auto& [holds, word] : states)
             line += holds ? word : "";
-        return line;
+        return line + looks(widget);
     }
 
     static QWidget* make(const QString& name)
