@@ -7,6 +7,7 @@
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
+#include <QRegularExpression>
 #include <QtTest>
 
 /// Tables of whole requests and replies, kept below tests/data: an object with a named object for each row.
@@ -43,11 +44,32 @@ inline void compare(const QJsonValue& got, const QJsonValue& expected)
     QTest::qVerify(got == expected, "equal values", both.constData(), __FILE__, __LINE__);
 }
 
-/// Fails where one of the lines is missing.
+/// Whether a line of the log, with its level before it, is the expected one, where an asterisk stands for anything.
+inline bool isLine(const QString& line, const QString& expected)
+{
+    const QString pattern = '^' + QRegularExpression::escape(expected).replace("\\*", ".*") + '$';
+    return QRegularExpression(pattern, QRegularExpression::DotMatchesEverythingOption).match(line).hasMatch();
+}
+
+/// Fails where the log is not made of these lines, in this order.
 inline void compareLog(const LogCapture& log, const QJsonValue& lines)
 {
-    for (const QJsonValue& line : lines.toArray())
-        QVERIFY2(log.contains(line.toString()), qPrintable(line.toString() + "\n\n" + log.lines().join('\n')));
+    const QStringList got = log.records();
+    const QStringList expected = lines.toVariant().toStringList();
+    for (int i = 0; i < qMax(got.size(), expected.size()); ++i) {
+        const QString both = "expected: " + expected.value(i) + "\ngot: " + got.value(i) + "\nof:\n";
+        QVERIFY2(isLine(got.value(i), expected.value(i)), qPrintable(both + got.join('\n')));
+    }
+}
+
+/// Fails where one of the lines is not in the log, which several threads wrote.
+inline void findInLog(const LogCapture& log, const QJsonValue& lines)
+{
+    const QStringList got = log.records();
+    for (const QJsonValue& line : lines.toArray()) {
+        const auto same = [&line](const QString& one) { return isLine(one, line.toString()); };
+        QVERIFY2(std::any_of(got.begin(), got.end(), same), qPrintable(line.toString() + "\nin:\n" + got.join('\n')));
+    }
 }
 
 } // namespace fixture
