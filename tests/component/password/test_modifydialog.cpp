@@ -90,6 +90,7 @@ private slots:
     void serviceAnswers()
     {
         QFETCH(QJsonObject, row);
+        const LogCapture log;
         m_platform.addFault({{"dbus", "ModifyUserPassword"}}, row["action"].toObject());
         fill(kOld, kNew, kNew);
         confirm()->click();
@@ -99,6 +100,7 @@ private slots:
         QCOMPARE(fresh()->alertMessage(), row["new"].toString());
         fixture::compare(QJsonArray::fromStringList(m_boxes.texts), row["boxes"]);
         QCOMPARE(repeat()->text(), row["closes"].toBool() ? QString() : kNew);
+        fixture::compareLog(log, row["log"]);
     }
 
     void everyOpeningStartsEmpty()
@@ -153,6 +155,7 @@ private slots:
     void serverReplies()
     {
         QFETCH(QJsonObject, row);
+        const LogCapture log;
         const bool good = row["good"].toBool();
         m_dialog->show();
         QByteArray reply = row["body"].toString().toUtf8();
@@ -165,6 +168,7 @@ private slots:
         QCOMPARE(QJsonDocument::fromJson(testfiles::read(zent::kUserinfoPath)).object(), expected);
         QTRY_COMPARE(m_platform.record("process").size(), good ? 1 : 0);
         QCOMPARE(m_platform.record("process").value(0).value("token_ok").toBool(), good);
+        fixture::compareLog(log, row["log"]);
     }
 
     void tokenWithoutAGoodFile()

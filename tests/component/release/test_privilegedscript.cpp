@@ -43,6 +43,7 @@ private slots:
     void attempts()
     {
         QFETCH(QJsonObject, row);
+        const LogCapture log;
         const QString standin = qEnvironmentVariable("ROOM") + "/standin/" + kFrontEnd + ".rc";
         testfiles::write(standin, QByteArray::number(row["status"].toInt()));
         UpgradePriority* runner = UpgradePriority::GetInstance();
@@ -62,6 +63,7 @@ private slots:
         fixture::compare(asked, row["pauses"]);
         QTRY_COMPARE(runs(), row["starts"].toInt());
         testfiles::remove(standin);
+        fixture::compareLog(log, row["log"]);
     }
 
     void wordsOfAScript_data() { fixture::addRows("scriptrunners.json"); }
@@ -89,6 +91,7 @@ private slots:
             lines.append(function + "  strCmdList: \"" + word + '"');
         lines.append(function + "  nRet: " + QString::number(result));
         QCOMPARE(log.lines(), lines);
+        fixture::compareLog(log, row["log"]);
     }
 
     void workerMakesOnePassPerCall()

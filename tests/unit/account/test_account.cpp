@@ -103,10 +103,12 @@ private slots:
         QSignalSpy finished(&manager, &QNetworkAccessManager::finished);
         QNetworkReply* reply = manager.get(QNetworkRequest(QUrl("http://server.zent.test/any")));
         QTRY_COMPARE(finished.count(), 1);
+        const LogCapture log;
         row["of"] == "area" ? account.rcvAreainfoData(reply) : account.analysejson(reply);
         fixture::compare(told, row["told"]);
         QCOMPARE(m_intervals.size(), row["refreshed"].toBool() ? 1 : 0);
         QVERIFY(m_intervals.isEmpty() || m_intervals.first() == qMakePair(900000, 600000));
+        fixture::compareLog(log, row["log"]);
     }
 
     void administrators()

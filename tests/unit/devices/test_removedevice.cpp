@@ -69,6 +69,7 @@ private slots:
         fixture::compare(QJsonArray::fromStringList(unmounted().replaceInStrings(m_root + '/', "")), row["unmounted"]);
         // Only what is a user id may become part of a path.
         QCOMPARE(log.count("not a user id"), row.contains("uid") ? 1 : 0);
+        fixture::compareLog(log, row["log"]);
     }
 
     void failuresDoNotStopIt()

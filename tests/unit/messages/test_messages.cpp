@@ -91,10 +91,12 @@ private slots:
     void configurations()
     {
         QFETCH(QJsonObject, row);
+        const LogCapture log;
         testfiles::write(zent::kUserinfoPath, QJsonDocument(row["file"].toObject()).toJson());
         QNotification client;
         QCOMPARE(client.loadCfg(), 0);
         fixture::compare(client.listUrl(), row["list"]);
+        fixture::compareLog(log, row["log"]);
     }
 
     void files()
