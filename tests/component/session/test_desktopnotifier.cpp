@@ -81,7 +81,10 @@ private slots:
                 m_notifier->notify("<i>", "<a>", "&amp;\n2");
             QTRY_COMPARE(m_server->shown.size(), 3);
             QCOMPARE(m_server->asked, 1);
-            QCOMPARE(m_server->shown.first().mid(3, 2), QVariantList({title, body}));
+            const QVariantMap hints{{"desktop-entry", "zentw-info"}};
+            const QStringList action{"default", QStringLiteral("查看")};
+            QCOMPARE(m_server->shown.first(),
+                     QVariantList({QStringLiteral("域管平台"), 0U, "zentw-info", title, body, action, hints, -1}));
         }
     }
 
@@ -108,6 +111,18 @@ private slots:
         QCOMPARE(m_activated->size(), 1);
     }
 
+    void anotherServersNumbersAreNotOurs()
+    {
+        startServer();
+        showOne();
+        const uint ours = m_server->lastId;
+        startServer();
+        settle();
+        emit m_server->ActionInvoked(ours, "default");
+        settle();
+        QCOMPARE(m_activated->size(), 0);
+    }
+
     void failureIsReported_data() { fixture::addRows("notifierfailures.json"); }
     void failureIsReported()
     {
@@ -123,7 +138,7 @@ private slots:
         QCOMPARE(m_unavailable->size(), 0);
         QVERIFY(m_unavailable->wait(10000));
         QCOMPARE(m_unavailable->first(), QVariantList({"<t>", kSender, "<x>"}));
-        QCOMPARE(log.count("DesktopNotifier"), 1);
+        fixture::compareLog(log, row["log"]);
         // It has been shown otherwise by then.
         if (row["late"].toBool()) {
             m_server->answerLate();

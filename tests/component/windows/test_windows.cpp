@@ -8,12 +8,16 @@
 #include "modifydialog.h"
 #include "noticedialog.h"
 #include "notification.h"
+#include "notify.h"
 #include "paths.h"
 #include "resumedialog.h"
+#include "sessionhost.h"
 #include "spinerwin.h"
 #include "themehelper.h"
 
 #include <QAbstractButton>
+#include <QComboBox>
+#include <QDBusConnection>
 #include <QGridLayout>
 #include <QRegularExpression>
 
@@ -169,7 +173,26 @@ class TestWindows : public QObject
         QByteArray refusal = R"({"code": 1})";
         window.analyseEvnData(&refusal);
         window.callloadpolicy(2, "code");
+        QByteArray scenes = R"({"code": 0, "message": [{"scene_name": "A", "scene_code": "a"},
+                                                        {"scene_name": "B", "scene_code": "b"}]})";
+        window.analyseEvnData(&scenes);
+        window.findChild<QComboBox*>()->setCurrentIndex(1);
+        window.resetUIPos();
         window.findChild<QAbstractButton*>("NetInfo")->click();
+    }
+
+    /// What other programs of the session ask for.
+    static void useSession()
+    {
+        MainWindow window(nullptr, 1020);
+        const SessionHost host(window);
+        // The bus has the objects already.
+        const SessionHost second(window);
+        QObject* object = QDBusConnection::sessionBus().objectRegisteredAt("/com/vantor/tarn/Notification");
+        auto* notification = qobject_cast<Notification*>(object);
+        notification->Notify(1, "lisi", "title", "text", "sender");
+        notification->GioMount("maker", "product", "serial", "no id");
+        notification->Notify(1, "zhangsan", "title", "text", "sender");
     }
 
     static void useDialogs()
@@ -178,6 +201,10 @@ class TestWindows : public QObject
         verification.setIpPort("server", "");
         verification.Notify("text", "/fix");
         verification.hideWindow();
+        verification.Notify("open", "true");
+        verification.Notify("close", "false");
+        verification.confirmCliked();
+        verification.getDeviceIntegralityVarifyScript();
         verification.close();
         verification.Notify("success", "/fix");
         verification.close();
@@ -216,7 +243,8 @@ private slots:
         const std::map<QString, std::function<void()>> uses{{"account", useAccount},
                                                             {"window", [] { useWindow(1020); }},
                                                             {"newer window", [] { useWindow(1030); }},
-                                                            {"dialogs", useDialogs}};
+                                                            {"dialogs", useDialogs},
+                                                            {"session", useSession}};
         const LogCapture log;
         uses.at(QTest::currentDataTag())();
         fixture::compareLog(log, row["log"]);

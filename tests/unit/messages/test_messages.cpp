@@ -103,13 +103,17 @@ private slots:
     {
         // One for each kind of request, from the start.
         QCOMPARE(QNotification().findChildren<QNetworkAccessManager*>().size(), 3);
-        const auto fails = [](int result) { return QNotification().loadCfg() == result; };
+        const auto fails = [](int result, const QString& line) {
+            QNotification client;
+            const LogCapture log;
+            return client.loadCfg() == result && log.records() == QStringList(line);
+        };
         testfiles::write(zent::kUserinfoPath, R"({"protocol": "https", )");
-        QVERIFY(fails(-3));
+        QVERIFY(fails(-3, "warning parse config.json file failed."));
         QFile::setPermissions(zent::kUserinfoPath, {});
-        QVERIFY(fails(-2));
+        QVERIFY(fails(-2, "warning read config.json file failed."));
         testfiles::remove(zent::kUserinfoPath);
-        QVERIFY(fails(-1));
+        QVERIFY(fails(-1, "warning open config.json file failed. \"/etc/zent/userinfo.json\""));
     }
 
     void times()

@@ -1,15 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixture.h"
 #include "toolkitapplication.h"
+#include "toolkitblurframe.h"
 #include "toolkitbuttonbox.h"
 #include "toolkitcombobox.h"
 #include "toolkitdialog.h"
 #include "toolkitlabel.h"
 #include "toolkitpasswordedit.h"
 #include "toolkitspinner.h"
+#include "toolkitsuggestbutton.h"
 #include "toolkittitlebar.h"
 
 #include <QAbstractButton>
+#include <QAction>
 #include <QClipboard>
 #include <QHelpEvent>
 #include <QLabel>
@@ -84,6 +87,37 @@ private slots:
             QTest::keyClick(label, Qt::Key_C, Qt::ControlModifier);
             QCOMPARE(QGuiApplication::clipboard()->text(),
                      message.count('\n') < 20 ? message : QString(19, '\n') + "…");
+            // The menu copies the whole message while nothing is selected.
+            label->setSelection(0, 0);
+            QCOMPARE(label->actions().constFirst()->text(), QString("复制"));
+            label->actions().constFirst()->trigger();
+            QCOMPARE(QGuiApplication::clipboard()->text(), message);
+        }
+    }
+
+    void buttonsFitTheirTexts()
+    {
+        const std::tuple<const char*, int, int> rows[] = {{"", 14, 80}, {"终端", 14, 80}, {"终端别名终端", 14, 116}};
+        for (const auto& [text, pixels, width] : rows) {
+            ToolkitSuggestButton button(text);
+            button.setFont(font(pixels));
+            QCOMPARE(button.sizeHint(), QSize(width, 36));
+        }
+        ToolkitPushButton button("█");
+        button.setFont(font(100));
+        const int line = button.fontMetrics().height();
+        QCOMPARE(button.sizeHint(), QSize(button.fontMetrics().horizontalAdvance("█") + 32, line + 12));
+        QCOMPARE(button.minimumSizeHint(), QSize(0, line + 4));
+        ToolkitSuggestButton accented("█");
+        const QPalette palette = ThemeHelper::palette(ThemeHelper::LightType);
+        for (QPushButton* one : {static_cast<QPushButton*>(&button), static_cast<QPushButton*>(&accented)}) {
+            one->setPalette(palette);
+            one->setFont(font(100));
+            one->resize(one->sizeHint());
+            const auto ink = [one] { return one->grab().toImage().pixelColor(one->rect().center()); };
+            QCOMPARE(ink(), one == &accented ? QColor(Qt::white) : palette.color(QPalette::ButtonText));
+            one->setEnabled(false);
+            QCOMPARE(ink(), palette.color(QPalette::Disabled, QPalette::ButtonText));
         }
     }
 
@@ -339,6 +373,33 @@ private slots:
         QVERIFY(shown(dialog));
         QTest::keyClick(&dialog, Qt::Key_Escape);
         QVERIFY(!dialog.isVisible());
+    }
+
+    void frameKnowsItsKeys()
+    {
+        ToolkitBlurFrame frame;
+        auto* edit = new QLineEdit(&frame);
+        auto* button = new ToolkitPushButton("一", &frame);
+        auto* panel = new ToolkitBlurFrame(&frame);
+        QCOMPARE(frame.radius(), 12);
+        QCOMPARE(frame.maskAlpha(), 230);
+        QCOMPARE(frame.maskColor(), QColor(0xfa, 0xfa, 0xfb));
+        for (const auto& [alpha, kept] : {std::pair{-1, 0}, {300, 255}}) {
+            frame.setMaskAlpha(alpha);
+            QCOMPARE(frame.maskAlpha(), kept);
+        }
+        const QSignalSpy clicked(button, &QAbstractButton::clicked);
+        QVERIFY(shown(frame));
+        edit->setFocus();
+        QTest::keyClick(edit, Qt::Key_Return);
+        QCOMPARE(clicked.count(), 0);
+        for (const Qt::Key key : {Qt::Key_Return, Qt::Key_Enter, Qt::Key_A}) {
+            button->setFocus();
+            QTest::keyClick(&frame, key);
+        }
+        QCOMPARE(clicked.count(), 2);
+        QTest::keyClick(panel, Qt::Key_Escape);
+        QVERIFY(!frame.isVisible() && panel->isVisibleTo(&frame));
     }
 };
 

@@ -11,6 +11,7 @@
 #include <csignal>
 #include <sched.h>
 #include <sys/mount.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -149,6 +150,23 @@ private slots:
         QVERIFY(m_store->saveUserInfo(info));
         QCOMPARE(storedObject().keys(), QStringList({"domain_host", "domain_port", "is_Domain", "server_host",
                                                      "server_port", "terminal_name"}));
+    }
+
+    void fullDiskLeavesTheFile()
+    {
+        testfiles::write(kUserinfoPath, kWhole);
+        std::signal(SIGXFSZ, SIG_IGN);
+        rlimit before{};
+        getrlimit(RLIMIT_FSIZE, &before);
+        const rlimit full{20, before.rlim_max};
+        setrlimit(RLIMIT_FSIZE, &full);
+        const LogCapture log;
+        const bool saved = m_store->saveDomain(false) || m_store->saveUserInfo(UserInfo());
+        setrlimit(RLIMIT_FSIZE, &before);
+        QVERIFY(!saved);
+        QCOMPARE(log.records(),
+                 QStringList({"warning write value failed, key: \"is_Domain\"", "warning write info json failed"}));
+        QCOMPARE(testfiles::read(kUserinfoPath), kWhole);
     }
 
     void killedWriterLeavesAWholeFile()
