@@ -152,8 +152,7 @@ class TestWindows : public QObject
     static void useAccount()
     {
         Account account;
-        account.getUserName();
-        account.isScenceUser();
+        qInfo() << account.getUserName() << account.isAdminUser() << account.isScenceUser();
         for (const char* text : {R"({"code": 0, "data": {"user": {"id": 7, "gecos": "A,b,c,1", "client_name": "PC"}}})",
                                  R"({"code": 0, "data": [{"name": "O"}]})", R"({"code": 1})", "{"}) {
             QByteArray body = text;
@@ -168,6 +167,7 @@ class TestWindows : public QObject
     {
         MainWindow window(nullptr, version);
         window.onActivatedSysTrayIcon(QSystemTrayIcon::Trigger);
+        qInfo() << window.windowFlags() << window.size() << window.windowTitle() << window.windowIcon().isNull();
         window.close();
         window.readScriptsFile("/none");
         QByteArray refusal = R"({"code": 1})";

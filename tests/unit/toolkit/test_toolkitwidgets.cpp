@@ -106,7 +106,7 @@ private slots:
         ToolkitPushButton button("█");
         button.setFont(font(100));
         const int line = button.fontMetrics().height();
-        QCOMPARE(button.sizeHint(), QSize(button.fontMetrics().horizontalAdvance("█") + 32, line + 12));
+        QCOMPARE(button.sizeHint(), QSize(button.fontMetrics().size(0, "█").width() + 32, line + 12));
         QCOMPARE(button.minimumSizeHint(), QSize(0, line + 4));
         ToolkitSuggestButton accented("█");
         const QPalette palette = ThemeHelper::palette(ThemeHelper::LightType);

@@ -24,8 +24,6 @@ public:
     /// Starts one verification run; its outcome comes through Notify().
     void getDeviceIntegralityVarifyScript();
 
-    QString repairUrl() const { return m_repairUrl; }
-
 signals:
     Q_SCRIPTABLE void confirmed();
     Q_SCRIPTABLE void hidewin();
