@@ -9,6 +9,7 @@
 #include "notification.h"
 #include "paths.h"
 #include "platformcontrol.h"
+#include "processrecord.h"
 #include "sessionhost.h"
 #include "toolkittitlebar.h"
 #include "trayhost.h"
@@ -182,6 +183,9 @@ private slots:
         m_window->system(QString("readlink /proc/self/fd/0; test -e /proc/$$/fd/%1 && echo open").arg(ends[1]));
         QCOMPARE(m_window->commandOutputLines(), QStringList("/dev/null\n"));
         QVERIFY(close(ends[0]) == 0 && close(ends[1]) == 0);
+        m_window->closewindow();
+        QTRY_COMPARE(processrecord::entries("killall").size(), 1);
+        QCOMPARE(processrecord::words(processrecord::entries("killall")[0]), QStringList({"-9", "tarn"}));
     }
 
     void agreedInterface()

@@ -123,12 +123,17 @@ private slots:
         for (const auto& [action, asked] : faults) {
             m_platform.addFault(kNetworkDaemon, action);
             m_platform.clearRecord();
+            const LogCapture log;
             for (int call = 0; call < 2; ++call) {
                 QVERIFY(!daemon.activeConnectionInfo());
                 startNetworkDaemon();
             }
             QCOMPARE(FileConfig::GetInstance()->getMacAddress(), QString());
             QCOMPARE(m_platform.record("dbus").size(), asked);
+            const QStringList paused =
+                log.lines().filter(QRegularExpression("\\. The network daemon is not asked again "
+                                                      "for 60 s\\.$"));
+            QCOMPARE(paused.size(), asked == 1 ? 1 : 0);
             startNetworkDaemon();
         }
     }

@@ -133,6 +133,8 @@ class TestWindows : public QObject
             panel->setSceneBox(name.endsWith("administrator"));
             return panel;
         }
+        if (name == "main window")
+            return new MainWindow(nullptr, 1020);
         if (name == "icon button")
             return new IconButton(nullptr);
         if (name == "password")

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixture.h"
+#include "lookups.h"
 #include "private/hostguard.h"
 
 class TestHostGuard : public QObject
@@ -22,6 +23,20 @@ private slots:
         }
         QCOMPARE(guard.objection(), row["objection"].toString());
         QVERIFY(guard.objection().isEmpty() || guard.failure() == 7);
+    }
+
+    void lookUpsAreCounted()
+    {
+        zent::http::noteLookup("127.0.0.1");
+        zent::http::noteLookup("::1");
+        QVERIFY(!zent::http::mayBeLookingUp());
+        const auto first = zent::http::noteLookup("server.zent.test");
+        const auto second = zent::http::noteLookup("server.zent.test");
+        for (const auto& end : {first, first, second}) {
+            QVERIFY(zent::http::mayBeLookingUp());
+            end();
+        }
+        QVERIFY(!zent::http::mayBeLookingUp());
     }
 };
 

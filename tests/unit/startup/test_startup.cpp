@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "gates.h"
+#include "idcommand.h"
 #include "log.h"
 #include "paths.h"
 #include "testfiles.h"
@@ -8,6 +9,7 @@
 #include <QRegularExpression>
 #include <QtTest>
 
+#include <csignal>
 #include <cstdlib>
 #include <cstring>
 #include <ctime>
@@ -59,6 +61,17 @@ private slots:
         qputenv("PATH", path);
         QVERIFY(after.ru_nvcsw - before.ru_nvcsw < 50);
         QVERIFY(std::clock() - processor < CLOCKS_PER_SEC / 3);
+    }
+
+    void forgottenIdEnds()
+    {
+        testfiles::write(m_room + "/standin/id.hook", "echo $PPID > $ROOM/id.pid; exec sleep 100");
+        {
+            const IdCommand command;
+            QTRY_VERIFY(testfiles::read(m_room + "/id.pid").endsWith('\n'));
+        }
+        testfiles::remove(m_room + "/standin/id.hook");
+        QCOMPARE(kill(testfiles::read(m_room + "/id.pid").trimmed().toInt(), 0), -1);
     }
 
     void minorVersion()
