@@ -119,12 +119,15 @@ def judge(suite, copy, fault, content):
 
 def _run_tests(suite, copy, fault):
     built = set()
+    hung = None
     for test in suite.knowing(fault.file):
         missing = set(test.programs) - built
         if missing and not copy.build(sorted(missing)):
             return "broken", None
         built |= missing
         word = test.run(copy)
-        if word != "passed":
-            return ("killed" if word == "failed" else word), test
-    return "survived", None
+        if word == "failed":
+            return "killed", test
+        if word == "timed out":
+            hung = hung or test
+    return ("timed out", hung) if hung else ("survived", None)

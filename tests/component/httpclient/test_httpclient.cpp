@@ -191,6 +191,7 @@ private slots:
     void requestsEnd()
     {
         QFETCH(QJsonObject, row);
+        const LogCapture log;
         const QJsonObject action = row["action"].toObject();
         m_platform.addFault({{"path", "/t"}}, action);
         Client client(kCa, 20);
@@ -198,6 +199,7 @@ private slots:
         QCOMPARE(client.reply, row["reply"].toString(QString(row["reply_bytes"].toInt(), 'x')));
         QVERIFY(m_platform.record("http").isEmpty() == action.isEmpty());
         QCOMPARE(client.get(kStatusUrl), 200);
+        fixture::compareLog(log, row["log"]);
     }
 
     void logsOneLineWithoutSecrets()

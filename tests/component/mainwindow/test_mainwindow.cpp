@@ -19,6 +19,7 @@
 #include <QCheckBox>
 #include <QComboBox>
 #include <QLabel>
+#include <QLayout>
 #include <QPlainTextEdit>
 #include <QPushButton>
 #include <QScreen>
@@ -309,7 +310,13 @@ private slots:
             QMetaObject::invokeMethod(m_window.get(), &MainWindow::openNotice, Qt::QueuedConnection);
         QTRY_VERIFY(notice()->isVisible());
         QCOMPARE(log.count("showNotice"), 300);
-        QCOMPARE(log.count("getNotifyMessageList()-01"), 1);
+        const QString step = "debug noticeDialog::getNotifyMessageList()-0%1:%2";
+        QCOMPARE(log.records().filter("noticeDialog::"),
+                 QStringList({step.arg(1).arg(" true"), step.arg(2).arg(" 1"), step.arg(3).arg("")}));
+        const QLayout* layout = notice()->findChild<QWidget*>("informationWidget")->layout();
+        const auto views = notice()->findChildren<QPlainTextEdit*>();
+        QCOMPARE(layout->indexOf(views[0]), 0);
+        QCOMPARE(layout->indexOf(views[1]), layout->count() - 2);
         // One beside it is the poll's.
         QVERIFY(m_platform.requests(kListPath).size() <= 2);
     }

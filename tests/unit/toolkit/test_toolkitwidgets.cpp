@@ -95,6 +95,25 @@ private slots:
         }
     }
 
+    void longWordsAreBroken()
+    {
+        // A combining mark and the second half of a pair stay where they are.
+        const std::pair<QString, QList<int>> rows[] = {{QString(24, 'a'), {24}},
+                                                       {QString(25, 'a'), {24, 1}},
+                                                       {QString(49, 'a'), {24, 24, 1}},
+                                                       {QString(23, 'a') + " " + QString(24, 'a'), {48}},
+                                                       {QString('a') + QString("𝐀").repeated(13), {25, 2}},
+                                                       {QString(24, 'a') + QChar(0x301) + "a", {25, 1}}};
+        for (const auto& [message, pieces] : rows) {
+            ToolkitDialog dialog;
+            dialog.setMessage(message);
+            QList<int> got;
+            for (const QString& piece : dialog.findChild<QLabel*>("messageLabel")->text().split(QChar(0x200b)))
+                got.append(piece.size());
+            QCOMPARE(got, pieces);
+        }
+    }
+
     void buttonsFitTheirTexts()
     {
         const std::tuple<const char*, int, int> rows[] = {{"", 14, 80}, {"终端", 14, 80}, {"终端别名终端", 14, 116}};
