@@ -1,20 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "boxcloser.h"
+#include "compositor.h"
 #include "fixture.h"
+#include "portal.h"
 #include "queuedinput.h"
 #include "toolkitapplication.h"
 #include "toolkitblurframe.h"
 #include "toolkitpasswordedit.h"
 
 #include <QAbstractButton>
-#include <QDBusConnection>
-#include <QDBusMessage>
-#include <QDBusVariant>
 #include <QLabel>
 #include <QLayout>
 #include <QProcess>
 #include <QScreen>
-#include <QX11Info>
 
 #include <unistd.h>
 #include <xcb/shape.h>
@@ -22,19 +20,7 @@
 namespace
 {
 
-const char kBlurProperty[] = "_KDE_NET_WM_BLUR_BEHIND_REGION";
-
-template <typename Reply>
-std::unique_ptr<Reply, decltype(&std::free)> owned(Reply* reply)
-{
-    return {reply, &std::free};
-}
-
-xcb_atom_t atom(const char* name)
-{
-    const auto cookie = xcb_intern_atom(QX11Info::connection(), 0, uint16_t(strlen(name)), name);
-    return owned(xcb_intern_atom_reply(QX11Info::connection(), cookie, nullptr))->atom;
-}
+using namespace xwindows;
 
 /// What the server has as the window's shape: the pixels that are missing at the left of each row, until none are.
 QList<int> insets(const QWidget& window, int& rows)
@@ -67,55 +53,6 @@ QList<quint32> blurred(const QWidget& window)
     const auto* values = static_cast<const quint32*>(xcb_get_property_value(reply.get()));
     return {values, values + xcb_get_property_value_length(reply.get()) / 4};
 }
-
-/// Stands in for a compositing manager for as long as it lives, one that blurs.
-class Compositor
-{
-public:
-    Compositor()
-    {
-        m_window.winId();
-        const quint32 blurs = 1;
-        xcb_change_property(QX11Info::connection(), XCB_PROP_MODE_REPLACE, QX11Info::appRootWindow(),
-                            atom(kBlurProperty), XCB_ATOM_CARDINAL, 32, 1, &blurs);
-        own(xcb_window_t(m_window.winId()));
-    }
-    ~Compositor() { own(XCB_NONE); }
-
-private:
-    static void own(xcb_window_t owner)
-    {
-        xcb_set_selection_owner(QX11Info::connection(), owner, atom("_NET_WM_CM_S0"), XCB_CURRENT_TIME);
-        xcb_flush(QX11Info::connection());
-        if (!QTest::qWaitFor([owner] { return QX11Info::isCompositingManagerRunning() == (owner != XCB_NONE); }))
-            qFatal("Qt does not see the compositing manager");
-    }
-    QWidget m_window;
-};
-
-/// The desktop portal, whose colours are dark.
-class Portal : public QObject
-{
-    Q_OBJECT
-    Q_CLASSINFO("D-Bus Interface", "org.freedesktop.portal.Settings")
-
-public:
-    static void change(const QString& nameSpace, const QString& key, const QVariant& value)
-    {
-        auto signal = QDBusMessage::createSignal("/org/freedesktop/portal/desktop", "org.freedesktop.portal.Settings",
-                                                 "SettingChanged");
-        signal << nameSpace << key << QVariant::fromValue(QDBusVariant(value));
-        QDBusConnection::sessionBus().send(signal);
-    }
-    QString asked;
-
-public slots:
-    QDBusVariant Read(const QString& nameSpace, const QString& key)
-    {
-        asked = nameSpace + ' ' + key;
-        return QDBusVariant(QVariant::fromValue(QDBusVariant(1U)));
-    }
-};
 
 } // namespace
 
