@@ -86,6 +86,25 @@ class TestTerminalNames : public QObject
     Q_OBJECT
 
 private slots:
+    void bearableRules()
+    {
+        const std::pair<QString, bool> rows[] = {
+            {QString(512, 'a'), true}, {QString(513, 'a'), false}, {"a{512}", true},
+            {"a{513}", false},         {"a{2,513}", false},        {"a{,513}", false},
+            {"a{513,}", false},        {"a{513", false},           {"(?:a{255}b){2}", true},
+            {"(a{255}bc){2}", false},  {"(a?){1,32}", true},       {"(a?){1,33}", false},
+            {"(a{0,1}){32}", true},    {"(a{0,1}){33}", false},    {"(a|b){32}", true},
+            {"(a|b){33}", false},      {"(a+){33}", true},         {"(a*)*", true},
+            {"((a*)*)*", false},       {"((a+){2})?", true},       {"((a+){2})+", false},
+            {"(?=a{32})", true},       {"(?=a{33})", false},       {"(?!a{33})", false},
+            {"(?=(a*)*)", false},      {"(?:a{33})", true},        {"[^]a*+?|(]{512}", true},
+            {"[a\\]b]{513}", false},   {"\\{{512}", true},         {"(a)\\1", false},
+            {"(a)\\0", true},          {"(a)[\\1]", true},         {"^^^$$$a{512}", true},
+            {"()()a{511}", false},     {"()(a{511})", true},       {"a{511}b", true}};
+        for (const auto& [rule, bearable] : rows)
+            QVERIFY2(zent::isBearableRule(rule) == bearable, qPrintable(rule));
+    }
+
     void generatedRules()
     {
         for (int seed = 0; seed < 200; ++seed) {
