@@ -13,16 +13,21 @@ private slots:
     void pollsAreHeldBackFor()
     {
         QFETCH(QJsonObject, row);
+        const LogCapture log;
         HostGuard guard("server", 443);
         for (const QJsonValue& poll : row["polls"].toArray()) {
             guard.note(poll == "no connection" ? HostGuard::Outcome::ConnectTimedOut
                        : poll == "no reply"    ? HostGuard::Outcome::ReplyTimedOut
+                       : poll == "met"         ? HostGuard::Outcome::Met
+                       : poll == "unknown"     ? HostGuard::Outcome::Unknown
                                                : HostGuard::Outcome::Answered,
                        7);
-            guard.notePollTime(std::chrono::milliseconds(poll.toInt(2000)), 7);
+            if (poll != "met" && poll != "unknown")
+                guard.notePollTime(std::chrono::milliseconds(poll.toInt(2000)), 7);
         }
         QCOMPARE(guard.objection(), row["objection"].toString());
         QVERIFY(guard.objection().isEmpty() || guard.failure() == 7);
+        fixture::compareLog(log, row["log"]);
     }
 
     void lookUpsAreCounted()
