@@ -20,6 +20,8 @@
 #include <QComboBox>
 #include <QLabel>
 #include <QLayout>
+#include <QNetworkAccessManager>
+#include <QNetworkReply>
 #include <QPlainTextEdit>
 #include <QPushButton>
 #include <QScreen>
@@ -93,6 +95,23 @@ private slots:
         QCOMPARE(MainWindow::unreadMessageCount, 1);
         m_window->onReadAllMessage();
         QCOMPARE(MainWindow::unreadMessageCount, 0);
+    }
+
+    void areaReplyDecidesOnTheScenes()
+    {
+        QNetworkAccessManager manager;
+        for (const int status : {200, 404}) {
+            m_platform.addFault({{"path", "/any"}},
+                                {{"status", status}, {"body", R"({"code": 0, "data": [{"name": "N"}]})"}});
+            QNetworkReply* reply = manager.get(QNetworkRequest(QUrl("http://server.zent.test/any")));
+            QTRY_VERIFY(reply->isFinished());
+            m_platform.clearRecord();
+            m_window->rcvAreainfoData(reply);
+            QTRY_COMPARE(m_platform.requests("/api/client/area/scenes").size(), status == 200 ? 1 : 0);
+            QTRY_COMPARE(sceneBox()->isHidden(), status != 200);
+        }
+        emit m_window->startgetMeInfo();
+        QCOMPARE(m_platform.requests("/uim/v3/client/account").size(), 1);
     }
 
     void choiceOfSceneIsTheUsers()
