@@ -27,6 +27,15 @@ private slots:
         // The tool tip of an earlier long value stays.
         panel.setLoginInfo({"a", "b", "c", "d", "e", "f"});
         QCOMPARE(panel.findChild<QLabel*>("nameValue")->toolTip(), longName);
+        panel.setNetInfo({"1", "2", "3", "4", "5", "6", "7", "8"});
+        QStringList shown;
+        for (const QLabel* label : panel.findChildren<QLabel*>()) {
+            if (label->text().size() == 1)
+                shown.append(label->objectName() + ' ' + label->text());
+        }
+        QCOMPARE(shown, QStringList({"terminalValue a", "nameValue b", "macValue c", "userRoleValue d",
+                                     "departmentValue f", "hostValue 1", "nameValue 2", "macValue 3", "ipv4Value 4",
+                                     "ipV4GatewayValue 5", "dnsValeu 6", "subnetmaskValue 7", "netspeedValue 8"}));
     }
 
     void markupIsShownAsText()
