@@ -285,6 +285,10 @@ private slots:
         QCOMPARE(m_store->saveDomain(row["value"].toBool()), row["saved"].toBool());
         const QByteArray stored = testfiles::read(kUserinfoPath);
         QCOMPARE(QJsonDocument::fromJson(stored).object(), row["stored"].toObject());
+        // What changes nothing writes nothing.
+        const QByteArray before = row["content"].toString().toUtf8();
+        if (QJsonDocument::fromJson(before).object() == row["stored"].toObject())
+            QCOMPARE(stored, before);
         fixture::compareLog(log, row["log"]);
     }
 
