@@ -20,13 +20,11 @@
 namespace
 {
 
-using namespace xwindows;
-
 /// What the server has as the window's shape: the pixels that are missing at the left of each row, until none are.
 QList<int> insets(const QWidget& window, int& rows)
 {
     const auto cookie = xcb_shape_get_rectangles(QX11Info::connection(), window.winId(), XCB_SHAPE_SK_BOUNDING);
-    const auto reply = owned(xcb_shape_get_rectangles_reply(QX11Info::connection(), cookie, nullptr));
+    const auto reply = xwindows::owned(xcb_shape_get_rectangles_reply(QX11Info::connection(), cookie, nullptr));
     QRegion region;
     const xcb_rectangle_t* rectangles = xcb_shape_get_rectangles_rectangles(reply.get());
     for (int i = 0; i < xcb_shape_get_rectangles_rectangles_length(reply.get()); ++i)
@@ -45,13 +43,9 @@ QList<int> insets(const QWidget& window, int& rows)
 }
 
 /// The rectangles behind the window that are to be blurred.
-QList<quint32> blurred(const QWidget& window)
+QVector<quint32> blurred(const QWidget& window)
 {
-    const auto cookie = xcb_get_property(QX11Info::connection(), 0, xcb_window_t(window.winId()), atom(kBlurProperty),
-                                         XCB_ATOM_CARDINAL, 0, 1000);
-    const auto reply = owned(xcb_get_property_reply(QX11Info::connection(), cookie, nullptr));
-    const auto* values = static_cast<const quint32*>(xcb_get_property_value(reply.get()));
-    return {values, values + xcb_get_property_value_length(reply.get()) / 4};
+    return xwindows::property(window.winId(), kBlurProperty);
 }
 
 } // namespace
@@ -152,23 +146,23 @@ private slots:
         QVERIFY(QTest::qWaitForWindowActive(&frame));
         const auto corner = [&frame] { return frame.grab().toImage().pixelColor(0, 0).alpha(); };
         int rows = 0;
-        QCOMPARE(blurred(frame), QList<quint32>());
+        QCOMPARE(blurred(frame), QVector<quint32>());
         QCOMPARE(corner(), 255);
         {
             const Compositor compositor;
             frame.update();
             QTRY_VERIFY(insets(frame, rows).isEmpty());
             QVERIFY(corner() < 20);
-            const QList<quint32> region = blurred(frame);
-            QCOMPARE(region.mid(0, 4), (QList<quint32>{9, 0, 182, 1}));
+            const QVector<quint32> region = blurred(frame);
+            QCOMPARE(region.mid(0, 4), (QVector<quint32>{9, 0, 182, 1}));
             frame.setMaskAlpha(255);
-            QCOMPARE(blurred(frame), QList<quint32>());
+            QCOMPARE(blurred(frame), QVector<quint32>());
             frame.setMaskAlpha(254);
             QCOMPARE(blurred(frame), region);
             ToolkitDialog dialog;
             dialog.show();
             QVERIFY(QTest::qWaitForWindowExposed(&dialog));
-            QCOMPARE(blurred(dialog), QList<quint32>());
+            QCOMPARE(blurred(dialog), QVector<quint32>());
         }
         frame.update();
         QTRY_COMPARE(insets(frame, rows).size(), 9);
