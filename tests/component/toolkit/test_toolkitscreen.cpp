@@ -2,6 +2,7 @@
 #include "boxcloser.h"
 #include "compositor.h"
 #include "fixture.h"
+#include "instancelock.h"
 #include "portal.h"
 #include "queuedinput.h"
 #include "toolkitapplication.h"
@@ -270,6 +271,27 @@ private slots:
         QVERIFY(application->setSingleInstance("some key"));
         QVERIFY(log.lines().contains("running without the single-instance lock for some key"));
         QFile::setPermissions(directory, QFile::ReadOwner | QFile::WriteOwner | QFile::ExeOwner);
+        // What is no folder is nobody's folder.
+        QVERIFY(QDir().rename(directory, directory + "-aside"));
+        testfiles::write(directory, "");
+        QVERIFY(InstanceLock::userDirectory() != directory);
+        QVERIFY(QFile::remove(directory) && QDir().rename(directory + "-aside", directory));
+        QCOMPARE(InstanceLock::userDirectory(), directory);
+    }
+
+    void platformPluginIsTheUsersOrOfTheDisplay()
+    {
+        const QByteArray display = qgetenv("DISPLAY");
+        const std::tuple<const char*, const char*, QByteArray> rows[] = {
+            {":1", "", "xcb;wayland"}, {"", "", ""}, {":1", "offscreen", "offscreen"}, {"", "offscreen", "offscreen"}};
+        for (const auto& [shown, chosen, plugin] : rows) {
+            qputenv("DISPLAY", shown);
+            *chosen ? qputenv("QT_QPA_PLATFORM", chosen) : qunsetenv("QT_QPA_PLATFORM");
+            ToolkitApplication::loadPlatformPlugin();
+            QCOMPARE(qgetenv("QT_QPA_PLATFORM"), plugin);
+        }
+        qputenv("DISPLAY", display);
+        qunsetenv("QT_QPA_PLATFORM");
     }
 };
 
