@@ -30,6 +30,15 @@ private slots:
         fixture::compareLog(log, row["log"]);
     }
 
+    void aRefusalShowsThatTheHostIsThere()
+    {
+        // Nobody listens there.
+        HostGuard guard("127.0.0.1", 1);
+        guard.note(HostGuard::Outcome::ConnectTimedOut, 7);
+        QVERIFY(!guard.objection().isEmpty());
+        QTRY_COMPARE(guard.objection(), QString());
+    }
+
     void lookUpsAreCounted()
     {
         zent::http::noteLookup("127.0.0.1");
