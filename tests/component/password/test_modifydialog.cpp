@@ -182,6 +182,9 @@ private slots:
             QCOMPARE(QFile::exists(zent::kUserinfoPath), *content != '\0');
             QCOMPARE(testfiles::read(zent::kUserinfoPath), QByteArray(content));
             QCOMPARE(m_boxes.texts.filter("域管终端提示").size(), 1);
+            QCOMPARE(m_log->lines().filter(QRegularExpression("parse file failed!$")).size(), *content ? 1 : 0);
+            m_log.reset();
+            m_log = std::make_unique<LogCapture>();
         }
         testfiles::write(zent::kUserinfoPath, m_info);
         QFile::setPermissions(zent::kUserinfoPath, QFile::ReadOwner);

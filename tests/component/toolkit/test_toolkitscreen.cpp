@@ -111,6 +111,13 @@ private slots:
             QApplication::setPalette(palette);
             QTRY_COMPARE(ThemeHelper::instance()->themeType(), type);
         }
+        // A preference beats a dark palette.
+        QPalette dark = before;
+        dark.setColor(QPalette::Window, Qt::black);
+        QApplication::setPalette(dark);
+        QTRY_COMPARE(ThemeHelper::instance()->themeType(), ThemeHelper::DarkType);
+        Portal::change("org.freedesktop.appearance", "color-scheme", 2U);
+        QTRY_COMPARE(ThemeHelper::instance()->themeType(), ThemeHelper::LightType);
         QApplication::setPalette(before);
     }
 

@@ -253,6 +253,8 @@ private slots:
         const QRect field = edit.geometry();
         const QRect got = bubble->geometry();
         QVERIFY(bubble->isVisible() && window.rect().contains(got));
+        if (row.contains("width"))
+            QCOMPARE(got.width(), row["width"].toInt());
         const bool inside = field.contains(got);
         QCOMPARE(inside                            ? "inside"
                  : got.top() == field.bottom() + 5 ? "below"

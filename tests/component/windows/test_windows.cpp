@@ -14,6 +14,7 @@
 #include "sessionhost.h"
 #include "spinerwin.h"
 #include "themehelper.h"
+#include "toolkitblurframe.h"
 
 #include <QAbstractButton>
 #include <QComboBox>
@@ -108,6 +109,9 @@ class TestWindows : public QObject
             line += QString(" at %1,%2").arg(widget->x()).arg(widget->y());
         if (widget->layout())
             line += spaces(widget->layout());
+        if (const auto* frame = qobject_cast<const ToolkitBlurFrame*>(widget))
+            line +=
+                QString(" mask %1 %2 %3").arg(frame->maskColor().name()).arg(frame->maskAlpha()).arg(frame->radius());
         for (const char* property :
              {"windowTitle", "accessibleName", "text", "placeholderText", "alignment", "echoMode", "readOnly",
               "default", "styleSheet", "toolTip", "wordWrap", "maxLength"}) {
@@ -178,7 +182,8 @@ class TestWindows : public QObject
         QByteArray scenes = R"({"code": 0, "message": [{"scene_name": "A", "scene_code": "a"},
                                                         {"scene_name": "B", "scene_code": "b"}]})";
         window.analyseEvnData(&scenes);
-        window.findChild<QComboBox*>()->setCurrentIndex(1);
+        for (const int scene : {1, 0})
+            window.findChild<QComboBox*>()->setCurrentIndex(scene);
         window.resetUIPos();
         window.findChild<QAbstractButton*>("NetInfo")->click();
     }

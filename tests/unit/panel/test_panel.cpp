@@ -2,6 +2,7 @@
 #include "infowidget.h"
 #include "toolkitapplication.h"
 
+#include <QAbstractButton>
 #include <QLabel>
 #include <QtTest>
 
@@ -36,6 +37,16 @@ private slots:
         QCOMPARE(shown, QStringList({"terminalValue a", "nameValue b", "macValue c", "userRoleValue d",
                                      "departmentValue f", "hostValue 1", "nameValue 2", "macValue 3", "ipv4Value 4",
                                      "ipV4GatewayValue 5", "dnsValeu 6", "subnetmaskValue 7", "netspeedValue 8"}));
+    }
+
+    void aPageAtATime()
+    {
+        InfoWidget panel(nullptr, false);
+        for (const bool network : {true, false, true}) {
+            panel.findChild<QAbstractButton*>(network ? "NetInfo" : "LoginInfo")->click();
+            QCOMPARE(panel.findChild<QLabel*>("dnsValeu")->isVisibleTo(&panel), network);
+            QCOMPARE(panel.findChild<QLabel*>("loginValue")->isVisibleTo(&panel), !network);
+        }
     }
 
     void markupIsShownAsText()

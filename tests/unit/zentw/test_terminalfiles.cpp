@@ -203,6 +203,13 @@ private slots:
         QCOMPARE(zent::base::replaceFile(path, "end"), zent::base::WriteResult::Done);
         QCOMPARE(files(), QStringList("userinfo.json"));
         QCOMPARE(QFile::permissions(path) & (QFile::ReadGroup | QFile::ReadOther), QFile::Permissions());
+        // Whatever the mask for new files.
+        struct stat status {
+        };
+        QCOMPARE(chmod(QFile::encodeName(path).constData(), 0666), 0);
+        QCOMPARE(zent::base::replaceFile(path, "end"), zent::base::WriteResult::Done);
+        QCOMPARE(stat(QFile::encodeName(path).constData(), &status), 0);
+        QCOMPARE(status.st_mode & 07777U, 0666U);
     }
 
     void fileThatCannotBeReplacedIsWrittenInPlace()
