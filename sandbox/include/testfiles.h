@@ -10,6 +10,15 @@
 namespace testfiles
 {
 
+// Where the platform keeps a terminal's files, as agreed.
+inline const QString kInfoFile = "/etc/zent/userinfo.json";
+inline const QString kStagedInfoFile = "/tmp/zent/userinfo.json";
+inline const QString kMachineFile = "/usr/share/zent/machine.txt";
+inline const QString kAuthorityFile = "/etc/zent/clientapi_ca.crt";
+inline const QString kVersionFile = "/etc/os-version";
+inline const QString kBackupFile = "/etc/zent/config.ini";
+inline const QString kHostNameFile = "/etc/hostname";
+
 inline void write(const QString& path, const QByteArray& content)
 {
     QDir().mkpath(QFileInfo(path).path());

@@ -5,7 +5,6 @@
 #include "httprequest.h"
 #include "mainwindow.h"
 #include "notification.h"
-#include "paths.h"
 #include "platformcontrol.h"
 #include "sessionhost.h"
 #include "testfiles.h"
@@ -322,15 +321,15 @@ private slots:
 
     void theAuthorityIsFollowed()
     {
-        const QByteArray authority = testfiles::read(zent::kServerCertPath);
-        const QByteArray info = testfiles::read(zent::kUserinfoPath);
+        const QByteArray authority = testfiles::read(testfiles::kAuthorityFile);
+        const QByteArray info = testfiles::read(testfiles::kInfoFile);
         QJsonObject https = QJsonDocument::fromJson(info).object();
         https.insert("protocol", "https");
         https.insert("server_host", "server.zent.test");
         https.insert("server_port", 443);
-        testfiles::write(zent::kUserinfoPath, QJsonDocument(https).toJson());
+        testfiles::write(testfiles::kInfoFile, QJsonDocument(https).toJson());
         QNotification client;
-        testfiles::write(zent::kUserinfoPath, info);
+        testfiles::write(testfiles::kInfoFile, info);
         const auto answered = [&client] {
             std::optional<bool> result;
             client.getNotifyMessageList("zhangsan", true, 1, 1, [&](bool ok, const auto&) { result = ok; });
@@ -344,12 +343,12 @@ private slots:
             authority, testfiles::read("/run/room/tls/unknown_ca.crt"), authority, {}, authority};
         QList<bool> results;
         for (const QByteArray& content : contents) {
-            testfiles::write(zent::kServerCertPath, content);
+            testfiles::write(testfiles::kAuthorityFile, content);
             if (content.isEmpty())
-                testfiles::remove(zent::kServerCertPath);
+                testfiles::remove(testfiles::kAuthorityFile);
             results.append(answered() == true);
         }
-        testfiles::write(zent::kServerCertPath, authority);
+        testfiles::write(testfiles::kAuthorityFile, authority);
         QCOMPARE(results, (QList<bool>{true, false, true, false, true}));
     }
 

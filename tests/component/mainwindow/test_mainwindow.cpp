@@ -7,7 +7,6 @@
 #include "mainwindow.h"
 #include "noticedialog.h"
 #include "notification.h"
-#include "paths.h"
 #include "platformcontrol.h"
 #include "processrecord.h"
 #include "sessionhost.h"
@@ -33,7 +32,7 @@
 namespace
 {
 
-const QString kSceneFile = zent::kCurrentScenePath.arg("zhangsan");
+const QString kSceneFile = QString("/home/zhangsan/.cache/vantor/CurrentScene");
 const QString kListPath = QStringLiteral("/notification/v2/list");
 
 } // namespace

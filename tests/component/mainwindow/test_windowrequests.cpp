@@ -5,7 +5,6 @@
 #include "httprequest.h"
 #include "mainwindow.h"
 #include "networkdaemonproxy.h"
-#include "paths.h"
 #include "platformcontrol.h"
 #include "sessionhost.h"
 
@@ -39,8 +38,8 @@ private slots:
 
     void scenesAreAskedOnceAfterTheOrganisation()
     {
-        testfiles::write(zent::kMachineidPath, "M 1&2\n");
-        testfiles::write(zent::kUserinfoPath,
+        testfiles::write(testfiles::kMachineFile, "M 1&2\n");
+        testfiles::write(testfiles::kInfoFile,
                          R"({"server_host": "server.zent.test", "server_port": "80", "protocol": "https"})");
         m_window = std::make_unique<MainWindow>(nullptr, 1020);
         const SessionHost host(*m_window);

@@ -2,7 +2,6 @@
 #include "boxcloser.h"
 #include "fixture.h"
 #include "modifydialog.h"
-#include "paths.h"
 #include "platformcontrol.h"
 #include "toolkitpasswordedit.h"
 
@@ -22,7 +21,7 @@ class TestModifyDialog : public QObject
 
     PlatformControl m_platform;
     BoxCloser m_boxes;
-    const QByteArray m_info = testfiles::read(zent::kUserinfoPath);
+    const QByteArray m_info = testfiles::read(testfiles::kInfoFile);
     std::unique_ptr<LogCapture> m_log;
     std::unique_ptr<ModifyDialog> m_dialog;
 
@@ -57,7 +56,7 @@ private slots:
     {
         m_platform.clearFaults();
         m_platform.clearRecord();
-        testfiles::write(zent::kUserinfoPath, m_info);
+        testfiles::write(testfiles::kInfoFile, m_info);
         m_boxes.texts.clear();
         m_log = std::make_unique<LogCapture>();
         m_dialog = std::make_unique<ModifyDialog>();
@@ -165,7 +164,7 @@ private slots:
         QJsonObject expected = QJsonDocument::fromJson(m_info).object();
         if (row.contains("token"))
             expected["token"] = row["token"];
-        QCOMPARE(QJsonDocument::fromJson(testfiles::read(zent::kUserinfoPath)).object(), expected);
+        QCOMPARE(QJsonDocument::fromJson(testfiles::read(testfiles::kInfoFile)).object(), expected);
         QTRY_COMPARE(m_platform.record("process").size(), good ? 1 : 0);
         QCOMPARE(m_platform.record("process").value(0).value("token_ok").toBool(), good);
         fixture::compareLog(log, row["log"]);
@@ -174,23 +173,23 @@ private slots:
     void tokenWithoutAGoodFile()
     {
         for (const char* content : {"", "{\"token\": \"old\", ", "[\"token\"]"}) {
-            testfiles::remove(zent::kUserinfoPath);
+            testfiles::remove(testfiles::kInfoFile);
             if (*content)
-                testfiles::write(zent::kUserinfoPath, content);
+                testfiles::write(testfiles::kInfoFile, content);
             m_boxes.texts.clear();
             m_dialog->renewToken("T");
-            QCOMPARE(QFile::exists(zent::kUserinfoPath), *content != '\0');
-            QCOMPARE(testfiles::read(zent::kUserinfoPath), QByteArray(content));
+            QCOMPARE(QFile::exists(testfiles::kInfoFile), *content != '\0');
+            QCOMPARE(testfiles::read(testfiles::kInfoFile), QByteArray(content));
             QCOMPARE(m_boxes.texts.filter("域管终端提示").size(), 1);
             QCOMPARE(m_log->lines().filter(QRegularExpression("parse file failed!$")).size(), *content ? 1 : 0);
             m_log.reset();
             m_log = std::make_unique<LogCapture>();
         }
-        testfiles::write(zent::kUserinfoPath, m_info);
-        QFile::setPermissions(zent::kUserinfoPath, QFile::ReadOwner);
+        testfiles::write(testfiles::kInfoFile, m_info);
+        QFile::setPermissions(testfiles::kInfoFile, QFile::ReadOwner);
         m_boxes.texts.clear();
         m_dialog->renewToken("T");
-        testfiles::remove(zent::kUserinfoPath);
+        testfiles::remove(testfiles::kInfoFile);
         QCOMPARE(m_boxes.texts.filter("读取/etc/zent/userinfo.json失败，错误原因是：Permission denied").size(), 1);
         QVERIFY(m_log->contains("no config.json to use, error code:  5 , error detail:  \"Permission denied\""));
         // The dialog may go while the first notice is open.

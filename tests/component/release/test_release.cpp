@@ -3,7 +3,6 @@
 #include "closeguarddialog.h"
 #include "desktopsettings.h"
 #include "fixture.h"
-#include "paths.h"
 #include "platformcontrol.h"
 #include "spinerwin.h"
 #include "toolkitpasswordedit.h"
@@ -79,15 +78,12 @@ class TestRelease : public QObject
     void verifyKeptSecret(const QString& text)
     {
         QCOMPARE(m_log->lines().filter(text), QStringList());
-        for (const QString& path : {zent::kUserinfoPath, zent::kTmpUserinfoPath})
+        for (const QString& path : {testfiles::kInfoFile, testfiles::kStagedInfoFile})
             QVERIFY2(!testfiles::read(path).contains(text.toUtf8()), qPrintable(path));
     }
 
 private slots:
-    void initTestCase()
-    {
-        testfiles::write(zent::kBackupConfigPath, "[config]\nControlCenterList=accounts, network\n");
-    }
+    void initTestCase() { testfiles::write(testfiles::kBackupFile, "[config]\nControlCenterList=accounts, network\n"); }
 
     void init()
     {
@@ -155,7 +151,7 @@ private slots:
         QTRY_COMPARE(password()->text(), row["kept"].toString());
         QVERIFY(m_dialog->isVisible() && !spinner()->isVisible());
         QCOMPARE(desktopsettings::values(), m_managed);
-        QVERIFY(!QFile::exists(zent::kTmpUserinfoPath));
+        QVERIFY(!QFile::exists(testfiles::kStagedInfoFile));
         QCOMPARE(record("dbus") + record("process"), QStringList());
         verifyKeptSecret(typed);
         QTest::keyClick(password(), Qt::Key_Escape);
@@ -187,7 +183,7 @@ private slots:
         processes.sort();
         fixture::compare(QJsonArray::fromStringList(processes), expected["process"]);
         fixture::findInLog(*m_log, expected["log"]);
-        const QJsonObject info = QJsonDocument::fromJson(testfiles::read(zent::kTmpUserinfoPath)).object();
+        const QJsonObject info = QJsonDocument::fromJson(testfiles::read(testfiles::kStagedInfoFile)).object();
         QCOMPARE(info.value("is_Domain"), QJsonValue(false));
         QCOMPARE(m_boxes.texts, QStringList());
         verifyKeptSecret(kAdministratorPassword);

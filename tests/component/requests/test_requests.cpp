@@ -3,7 +3,6 @@
 #include "fixture.h"
 #include "httprequest.h"
 #include "notification.h"
-#include "paths.h"
 #include "platformcontrol.h"
 #include "timelimits.h"
 
@@ -90,8 +89,8 @@ private slots:
         note("sigRemoveStatus", &HttpRequest::sigRemoveStatus);
         note("sigCompanyName", &HttpRequest::sigCompanyName);
         note("sigUserInfo", &HttpRequest::sigUserInfo);
-        testfiles::write(zent::kMachineidPath, " M 1&2\n");
-        testfiles::write(zent::kUserinfoPath, R"({"protocol": "https", "server_host": "server.zent.test",
+        testfiles::write(testfiles::kMachineFile, " M 1&2\n");
+        testfiles::write(testfiles::kInfoFile, R"({"protocol": "https", "server_host": "server.zent.test",
             "server_port": 80, "notificition_prefix": "/box/v9", "token": "to ken"})");
         m_messages = std::make_unique<QNotification>();
         FileConfig* config = FileConfig::GetInstance();

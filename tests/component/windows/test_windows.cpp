@@ -9,7 +9,6 @@
 #include "noticedialog.h"
 #include "notification.h"
 #include "notify.h"
-#include "paths.h"
 #include "resumedialog.h"
 #include "sessionhost.h"
 #include "spinerwin.h"
@@ -226,7 +225,7 @@ private slots:
     void initTestCase()
     {
         QNotification::qInstance = new QNotification;
-        testfiles::remove(zent::kMachineidPath);
+        testfiles::remove(testfiles::kMachineFile);
     }
 
     void widgets_data() { fixture::addRows("windows.json"); }

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixture.h"
 #include "notification.h"
-#include "paths.h"
 #include "platformcontrol.h"
 #include "unreadpoll.h"
 
@@ -92,7 +91,7 @@ private slots:
     {
         QFETCH(QJsonObject, row);
         const LogCapture log;
-        testfiles::write(zent::kUserinfoPath, QJsonDocument(row["file"].toObject()).toJson());
+        testfiles::write(testfiles::kInfoFile, QJsonDocument(row["file"].toObject()).toJson());
         QNotification client;
         QCOMPARE(client.loadCfg(), 0);
         fixture::compare(client.listUrl(), row["list"]);
@@ -108,11 +107,11 @@ private slots:
             const LogCapture log;
             return client.loadCfg() == result && log.records() == QStringList(line);
         };
-        testfiles::write(zent::kUserinfoPath, R"({"protocol": "https", )");
+        testfiles::write(testfiles::kInfoFile, R"({"protocol": "https", )");
         QVERIFY(fails(-3, "warning parse config.json file failed."));
-        QFile::setPermissions(zent::kUserinfoPath, {});
+        QFile::setPermissions(testfiles::kInfoFile, {});
         QVERIFY(fails(-2, "warning read config.json file failed."));
-        testfiles::remove(zent::kUserinfoPath);
+        testfiles::remove(testfiles::kInfoFile);
         QVERIFY(fails(-1, "warning open config.json file failed. \"/etc/zent/userinfo.json\""));
     }
 

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixture.h"
-#include "paths.h"
 #include "platformcontrol.h"
 #include "scenes.h"
 #include "timelimits.h"
@@ -22,7 +21,7 @@ class TestScenes : public QObject
 
     PlatformControl m_platform;
     const QString m_user = QStringLiteral("zhangsan");
-    const QString m_file = zent::kCurrentScenePath.arg(m_user);
+    const QString m_file = QString("/home/%1/.cache/vantor/CurrentScene").arg(m_user);
     zent::Terminal m_terminal;
     QList<QPair<int, int>> m_intervals;
     std::unique_ptr<Scenes> m_scenes;

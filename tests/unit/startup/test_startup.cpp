@@ -2,7 +2,6 @@
 #include "gates.h"
 #include "idcommand.h"
 #include "log.h"
-#include "paths.h"
 #include "testfiles.h"
 
 #include <QCoreApplication>
@@ -79,11 +78,11 @@ private slots:
 
     void minorVersion()
     {
-        testfiles::write(zent::kOsVersionPath, "MinorVersion=1\nMinorVersion=1021\nX=1\n");
+        testfiles::write(testfiles::kVersionFile, "MinorVersion=1\nMinorVersion=1021\nX=1\n");
         QCOMPARE(getMiniVersion(), 1021);
-        testfiles::write(zent::kOsVersionPath, "MajorVersion=20\n");
+        testfiles::write(testfiles::kVersionFile, "MajorVersion=20\n");
         QCOMPARE(getMiniVersion(), -1);
-        testfiles::remove(zent::kOsVersionPath);
+        testfiles::remove(testfiles::kVersionFile);
         QCOMPARE(getMiniVersion(), 1000);
     }
 

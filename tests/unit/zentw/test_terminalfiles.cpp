@@ -4,7 +4,6 @@
 #include "filewrite.h"
 #include "fixture.h"
 #include "jsonreader.h"
-#include "paths.h"
 
 #include <QTemporaryDir>
 
@@ -16,8 +15,6 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-using zent::kHostnamePath;
-using zent::kUserinfoPath;
 using zent::base::FileContent;
 using zent::base::UserInfo;
 
@@ -31,25 +28,25 @@ const QByteArray kOlder = R"({"is_Domain": true, "server_host": "s.test", "serve
 
 QJsonObject storedObject()
 {
-    return QJsonDocument::fromJson(testfiles::read(kUserinfoPath)).object();
+    return QJsonDocument::fromJson(testfiles::read(testfiles::kInfoFile)).object();
 }
 
 void load(const QByteArray& content)
 {
-    testfiles::write(kUserinfoPath, content);
-    FileConfig::GetInstance()->readServerConfig(kUserinfoPath);
+    testfiles::write(testfiles::kInfoFile, content);
+    FileConfig::GetInstance()->readServerConfig(testfiles::kInfoFile);
 }
 
 /// Writes the content that the row has, if any.
 void writeContent(const QJsonObject& row)
 {
     if (row["content"].isString())
-        testfiles::write(kUserinfoPath, row["content"].toString().toUtf8());
+        testfiles::write(testfiles::kInfoFile, row["content"].toString().toUtf8());
 }
 
 void setReadOnly(bool readOnly)
 {
-    QFile::setPermissions(kUserinfoPath, readOnly ? QFile::ReadOwner : QFile::ReadOwner | QFile::WriteOwner);
+    QFile::setPermissions(testfiles::kInfoFile, readOnly ? QFile::ReadOwner : QFile::ReadOwner | QFile::WriteOwner);
 }
 
 } // namespace
@@ -85,19 +82,19 @@ class TestTerminalFiles : public QObject
 private slots:
     void init()
     {
-        testfiles::remove(kUserinfoPath);
-        testfiles::remove(QFileInfo(zent::kTmpUserinfoPath).path());
-        testfiles::write(kHostnamePath, "host-1\n");
+        testfiles::remove(testfiles::kInfoFile);
+        testfiles::remove(QFileInfo(testfiles::kStagedInfoFile).path());
+        testfiles::write(testfiles::kHostNameFile, "host-1\n");
     }
 
     void migratesAnOlderFileAndKeepsOtherKeys()
     {
-        testfiles::write(kUserinfoPath, kOlder);
+        testfiles::write(testfiles::kInfoFile, kOlder);
         setReadOnly(true);
         LogCapture log;
         QCOMPARE(m_store->getUserInfo(nullptr).domainHost, QString("10.0.0.7"));
         QCOMPARE(log.count("\"updateUserInfo\" open file failed!"), 2);
-        QCOMPARE(testfiles::read(kUserinfoPath), kOlder);
+        QCOMPARE(testfiles::read(testfiles::kInfoFile), kOlder);
         setReadOnly(false);
         m_store->getUserInfo(nullptr);
         QJsonObject expected = QJsonDocument::fromJson(kOlder).object();
@@ -108,13 +105,13 @@ private slots:
 
     void saveDomainWritesOnlyAChange()
     {
-        testfiles::write(kUserinfoPath, kWhole);
+        testfiles::write(testfiles::kInfoFile, kWhole);
         setReadOnly(true);
         QVERIFY(m_store->saveDomain(true));
         QVERIFY(!m_store->saveDomain(false));
         setReadOnly(false);
         // In a directory that nothing can be added to, the file is written in its place.
-        const QString directory = QFileInfo(kUserinfoPath).path();
+        const QString directory = QFileInfo(testfiles::kInfoFile).path();
         QFile::setPermissions(directory, QFile::ReadOwner | QFile::ExeOwner);
         const bool saved = m_store->saveDomain(false);
         QFile::setPermissions(directory, QFile::ReadOwner | QFile::WriteOwner | QFile::ExeOwner);
@@ -127,20 +124,20 @@ private slots:
     void badFilesAreReportedAndLeftAlone()
     {
         for (const QByteArray& content : {QByteArray(), kWhole.left(60), QByteArray("[1, 2]")}) {
-            testfiles::write(kUserinfoPath, content);
+            testfiles::write(testfiles::kInfoFile, content);
             LogCapture log;
             bool ok = true;
             m_store->getUserInfo(&ok);
             QVERIFY2(!ok && log.contains("\"getUserInfo\" can not get json key: \"is_Domain\""), content);
             QVERIFY2(!m_store->saveDomain(true), content);
             QVERIFY2(!zent::base::updateUserInfo<QString>("domain_host", "x"), content);
-            QCOMPARE(testfiles::read(kUserinfoPath), content);
+            QCOMPARE(testfiles::read(testfiles::kInfoFile), content);
         }
     }
 
     void saveUserInfoDropsTheOlderKey()
     {
-        testfiles::write(kUserinfoPath, kOlder);
+        testfiles::write(testfiles::kInfoFile, kOlder);
         UserInfo info = m_store->getUserInfo(nullptr);
         info.terminalName = "新终端";
         setReadOnly(true);
@@ -154,7 +151,7 @@ private slots:
 
     void fullDiskLeavesTheFile()
     {
-        testfiles::write(kUserinfoPath, kWhole);
+        testfiles::write(testfiles::kInfoFile, kWhole);
         std::signal(SIGXFSZ, SIG_IGN);
         rlimit before{};
         getrlimit(RLIMIT_FSIZE, &before);
@@ -166,7 +163,7 @@ private slots:
         QVERIFY(!saved);
         QCOMPARE(log.records(),
                  QStringList({"warning write value failed, key: \"is_Domain\"", "warning write info json failed"}));
-        QCOMPARE(testfiles::read(kUserinfoPath), kWhole);
+        QCOMPARE(testfiles::read(testfiles::kInfoFile), kWhole);
     }
 
     void killedWriterLeavesAWholeFile()
@@ -252,7 +249,7 @@ private slots:
     {
         load(kWhole);
         m_config->setIsDomain(false);
-        const QString staging = QFileInfo(zent::kTmpUserinfoPath).path();
+        const QString staging = QFileInfo(testfiles::kStagedInfoFile).path();
         QTemporaryDir elsewhere;
         QVERIFY(QFile::link(elsewhere.path(), staging));
         m_config->writeServerConfig();
@@ -269,8 +266,8 @@ private slots:
         QJsonObject expected = QJsonDocument::fromJson(kWhole).object();
         expected.insert("is_Domain", false);
         expected.remove("token");
-        QCOMPARE(QJsonDocument::fromJson(testfiles::read(zent::kTmpUserinfoPath)).object(), expected);
-        QCOMPARE(testfiles::read(kUserinfoPath), kWhole);
+        QCOMPARE(QJsonDocument::fromJson(testfiles::read(testfiles::kStagedInfoFile)).object(), expected);
+        QCOMPARE(testfiles::read(testfiles::kInfoFile), kWhole);
     }
 
     void terminalInfo_data() { fixture::addRows("infofiles.json"); }
@@ -290,7 +287,7 @@ private slots:
         writeContent(row);
         const LogCapture log;
         QCOMPARE(m_store->saveDomain(row["value"].toBool()), row["saved"].toBool());
-        const QByteArray stored = testfiles::read(kUserinfoPath);
+        const QByteArray stored = testfiles::read(testfiles::kInfoFile);
         QCOMPARE(QJsonDocument::fromJson(stored).object(), row["stored"].toObject());
         // What changes nothing writes nothing.
         const QByteArray before = row["content"].toString().toUtf8();
@@ -302,10 +299,10 @@ private slots:
     void machineId()
     {
         bool ok = false;
-        testfiles::write(zent::kMachineidPath, "\t M-1 2 \r\n\n");
+        testfiles::write(testfiles::kMachineFile, "\t M-1 2 \r\n\n");
         QCOMPARE(m_store->getMachineID(&ok, false), QString("M-1 2"));
         QVERIFY(ok);
-        testfiles::remove(zent::kMachineidPath);
+        testfiles::remove(testfiles::kMachineFile);
         const LogCapture log;
         QCOMPARE(m_store->getMachineID(&ok, false), QString());
         QVERIFY(!ok && log.contains("\"getMachineID\" open file failed!"));
@@ -318,8 +315,8 @@ private slots:
     void addresses()
     {
         QFETCH(QJsonObject, row);
-        testfiles::write(kUserinfoPath, QJsonDocument(row["file"].toObject()).toJson());
-        m_config->readServerConfig(kUserinfoPath);
+        testfiles::write(testfiles::kInfoFile, QJsonDocument(row["file"].toObject()).toJson());
+        m_config->readServerConfig(testfiles::kInfoFile);
         const LogCapture log;
         QCOMPARE(m_config->getServerUrl("/a b?").toString(QUrl::FullyEncoded), row["server"].toString());
         QCOMPARE(m_config->getDomainUrl("/x").toString(QUrl::FullyEncoded), row["domain"].toString());
@@ -333,28 +330,28 @@ private slots:
     {
         const auto name = [this] {
             m_config->setTerminalName("unknown");
-            m_config->readServerConfig(kUserinfoPath);
+            m_config->readServerConfig(testfiles::kInfoFile);
             return m_config->readTerminalName();
         };
         const LogCapture log;
-        testfiles::write(kHostnamePath, "host\n-9 \n");
+        testfiles::write(testfiles::kHostNameFile, "host\n-9 \n");
         QCOMPARE(name(), QString("host-9 "));
         QVERIFY(log.contains(" not found userinfo.json"));
-        testfiles::write(kUserinfoPath, "{}");
-        QFile::setPermissions(kUserinfoPath, {});
+        testfiles::write(testfiles::kInfoFile, "{}");
+        QFile::setPermissions(testfiles::kInfoFile, {});
         QCOMPARE(name(), QString("host-9 "));
         QVERIFY(log.contains("fail to open file userinfo.json !"));
-        QFile::setPermissions(kHostnamePath, {});
+        QFile::setPermissions(testfiles::kHostNameFile, {});
         QCOMPARE(name(), QString());
         QVERIFY(log.contains(" open filed : \"/etc/hostname\""));
-        testfiles::remove(kHostnamePath);
+        testfiles::remove(testfiles::kHostNameFile);
         QCOMPARE(name(), QString());
         QVERIFY(log.contains(" not found : \"/etc/hostname\""));
     }
 
     void stagingIsLogged()
     {
-        const QString directory = QFileInfo(zent::kTmpUserinfoPath).path();
+        const QString directory = QFileInfo(testfiles::kStagedInfoFile).path();
         const LogCapture log;
         m_config->writeServerConfig();
         QVERIFY(log.contains("FileConfig::writeServerInfo---strConfig: \"{\\n") && log.contains("write json success"));
