@@ -85,6 +85,8 @@ class Stage:
         self.desktop.run("xdotool", "windowfocus", "--sync", window, "type", text)
 
     def call(self, path, interface, method, *arguments):
+        # The name comes after the first log lines, for which the tests wait.
+        subprocess.run(["gdbus", "wait", "--session", "--timeout", "20", SERVICE], check=True)
         subprocess.run(["gdbus", "call", "--session", "-d", SERVICE, "-o", path, "-m", f"{interface}.{method}",
                         *arguments], check=True, capture_output=True)
 
