@@ -16,9 +16,10 @@ UNKNOWN_LIMIT = 300
 class Test:
     """A test of ctest: the programs it runs, and how long it took."""
 
-    def __init__(self, name, programs):
+    def __init__(self, name, programs, reads_sources):
         self.name = name
         self.programs = programs
+        self.reads_sources = reads_sources
         self.seconds = None
         self.proven = False
 
@@ -57,8 +58,10 @@ class Suite:
         for test in listed["tests"]:
             words = " ".join(test.get("command", []))
             used = [path.name for path in programs if re.search(re.escape(str(path)) + r"\b", words)]
-            if used and re.search(pattern, test["name"]):
-                self.tests.append(Test(test["name"], used))
+            labels = [one["value"] for one in test["properties"] if one["name"] == "LABELS"]
+            reads_sources = ["reads_sources"] in labels
+            if (used or reads_sources) and re.search(pattern, test["name"]):
+                self.tests.append(Test(test["name"], used, reads_sources))
         self._read_inputs()
         self._sources = {path.name: self._linked(path) for path in programs}
 
@@ -81,7 +84,8 @@ class Suite:
 
     def knowing(self, file):
         """The tests that have something of the file in them: first those whose own source includes its header, then
-        the others, then those that run the client; of each the quick ones first."""
+        the others, then those that run the client; of each the quick ones first. What only reads the sources comes
+        last, since a fault has compiled by then."""
         objects = [name for name, inputs in self._inputs.items() if file in inputs]
         sources = {Path(name).name[:-len(".o")] for name in objects} - {"mocs_compilation.cpp"}
         header = str(Path(file).with_suffix(".h"))
@@ -89,8 +93,9 @@ class Suite:
                 for match in [re.search(r"/(test_\w+|fuzzreplay)\.dir/", name)] if match}
 
         def rank(test):
-            return (test.is_end_to_end(), not near.intersection(test.programs), test.seconds or 0)
-        knowing = [test for test in self.tests if any(sources & self._sources[name] for name in test.programs)]
+            return (test.reads_sources, test.is_end_to_end(), not near.intersection(test.programs), test.seconds or 0)
+        knowing = [test for test in self.tests
+                   if test.reads_sources or any(sources & self._sources[name] for name in test.programs)]
         return sorted(knowing, key=rank)
 
     def drop(self, test):
