@@ -9,7 +9,7 @@ import sys
 import unittest
 import uuid
 
-SANDBOX = os.path.join(os.path.dirname(os.path.abspath(__file__)), "../../sandbox")
+SANDBOX = os.path.dirname(os.path.abspath(__file__))
 sys.dont_write_bytecode = True
 sys.path.insert(0, SANDBOX)
 import roomclient  # noqa: E402
