@@ -41,18 +41,15 @@ QUrl urlToSend(const QString& url)
 Result objectionTo(const QUrl& url)
 {
     if (!url.isValid() || url.host().isEmpty())
-        return {QNetworkReply::HostNotFoundError, QStringLiteral("no absolute URL"), 0, {}};
+        return {QNetworkReply::HostNotFoundError, QStringLiteral("no absolute URL")};
     if (url.scheme() != kHttps && url.scheme() != QLatin1String("http"))
-        return {QNetworkReply::ProtocolUnknownError, QStringLiteral("neither https nor http"), 0, {}};
+        return {QNetworkReply::ProtocolUnknownError, QStringLiteral("neither https nor http")};
     return {};
 }
 
 Result timeOut(const char* what, std::chrono::milliseconds time)
 {
-    return {QNetworkReply::TimeoutError,
-            QStringLiteral("%1 within %2 ms").arg(QLatin1String(what)).arg(time.count()),
-            0,
-            {}};
+    return {QNetworkReply::TimeoutError, QStringLiteral("%1 within %2 ms").arg(QLatin1String(what)).arg(time.count())};
 }
 
 /// What a request that has ended in time says about its host.

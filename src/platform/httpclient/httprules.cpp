@@ -111,12 +111,8 @@ QSslConfiguration tlsBesideSystem(const QString& ca)
 QNetworkRequest makeRequest(const QUrl& url)
 {
     QNetworkRequest request(url);
-    request.setAttribute(QNetworkRequest::RedirectPolicyAttribute, QNetworkRequest::ManualRedirectPolicy);
-    request.setAttribute(QNetworkRequest::CookieLoadControlAttribute, QNetworkRequest::Manual);
+    // Qt follows no redirect, keeps no reply and speaks HTTP/1.1 where nothing else is asked for.
     request.setAttribute(QNetworkRequest::CookieSaveControlAttribute, QNetworkRequest::Manual);
-    request.setAttribute(QNetworkRequest::CacheLoadControlAttribute, QNetworkRequest::AlwaysNetwork);
-    request.setAttribute(QNetworkRequest::CacheSaveControlAttribute, false);
-    request.setAttribute(QNetworkRequest::Http2AllowedAttribute, false);
     // Qt would ask for compressed replies and inflate them without a bound. With a header of ours it does neither.
     request.setRawHeader("Accept-Encoding", "identity");
     return request;

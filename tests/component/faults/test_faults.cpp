@@ -14,7 +14,7 @@
 #include <QLabel>
 #include <QRegularExpression>
 
-#include <optional>
+using namespace std::chrono_literals;
 
 namespace
 {
@@ -52,6 +52,11 @@ class TestFaults : public QObject
             texts.append(m_window->findChild<QLabel*>(label)->text());
         return texts.join('|') + QString(" %1 %2").arg(scenes()->count()).arg(MainWindow::unreadMessageCount);
     }
+    void start()
+    {
+        m_window = std::make_unique<MainWindow>(nullptr, 1020);
+        m_host = std::make_unique<SessionHost>(*m_window);
+    }
     void serve(const QString& name, int unread)
     {
         m_platform.patchState(
@@ -86,32 +91,18 @@ class TestFaults : public QObject
     void askEverything()
     {
         m_readSuccesses = 0;
-        const std::function<void()> requests[] = {
-            [this] { m_window->unreadMessages(); },
-            [this] {
-                QNotification::qInstance->readNotifyMessage(
-                    "0", [this](bool ok, const QString&) { m_readSuccesses += ok ? 1 : 0; });
-            },
-            [this] { m_window->getAllUserEnvironment(); },
-            [this] { emit m_window->startgetMeInfo(); },
-            [this] { m_window->getAreaInfo(); },
-            [this] { tryRelease(); },
-            [] { HttpRequest::GetInstance()->postQuitControl("zhangsan"); },
-        };
-        for (const auto& request : requests) {
-            request();
-            QCoreApplication::processEvents();
-        }
+        m_window->unreadMessages();
+        QNotification::qInstance->readNotifyMessage("0",
+                                                    [this](bool ok, const QString&) { m_readSuccesses += ok ? 1 : 0; });
+        m_window->getAllUserEnvironment();
+        QCoreApplication::processEvents();
+        emit m_window->startgetMeInfo();
+        m_window->getAreaInfo();
+        QCoreApplication::processEvents();
+        tryRelease();
+        QCoreApplication::processEvents();
+        HttpRequest::GetInstance()->postQuitControl("zhangsan");
     }
-    /// A window that has all it asks for, so that nothing but what a test asks is under way.
-    void startAnswered()
-    {
-        serve("before", 2);
-        m_window = std::make_unique<MainWindow>(nullptr, 1020);
-        m_host = std::make_unique<SessionHost>(*m_window);
-        QTRY_VERIFY_WITH_TIMEOUT(known().startsWith("before|N1|PC|before 3 "), kPatienceMs);
-    }
-
     /// A size of this process in KiB, by its name in the kernel's status file.
     static long memory(const char* name)
     {
@@ -120,14 +111,6 @@ class TestFaults : public QObject
     }
     /// Requests within one second share their URL and thus their callback.
     static void nextSecond() { QTest::qWait(1001 - QTime::currentTime().msec()); }
-
-    /// The rows wait more than they work, and leave holds behind: each is a program of its own, beside the others.
-    static void addRowsOfItsOwn(const QString& file)
-    {
-        if (qEnvironmentVariableIsSet("ZENT_ROWS_APART"))
-            QSKIP("each row is a test of its own");
-        fixture::addRows(file);
-    }
 
     QString failedPoll(const char* what) const
     {
@@ -145,10 +128,9 @@ class TestFaults : public QObject
         serve(QTest::currentDataTag(), 2);
         setFault(m_row["state"].toObject(), m_row["action"].toObject());
         MainWindow::unreadMessageCount = 0;
-        m_window = std::make_unique<MainWindow>(nullptr, 1020);
-        m_host = std::make_unique<SessionHost>(*m_window);
-        m_longestGap = 0;
+        start();
         m_sinceBeat.start();
+        m_beat.callOnTimeout(this, [this] { m_longestGap = std::max(m_longestGap, m_sinceBeat.restart()); });
         m_beat.start(5);
         const QString unknown = known();
         for (const char* poll : {"getusrInfo", "getCompanyName"})
@@ -224,11 +206,6 @@ class TestFaults : public QObject
     }
 
 private slots:
-    void initTestCase()
-    {
-        connect(&m_beat, &QTimer::timeout, this,
-                [this] { m_longestGap = std::max(m_longestGap, m_sinceBeat.restart()); });
-    }
     void cleanup()
     {
         m_beat.stop();
@@ -237,7 +214,7 @@ private slots:
         setFault({}, {});
     }
 
-    void everyRequestUnder_data() { addRowsOfItsOwn("faults.json"); }
+    void everyRequestUnder_data() { fixture::addRows("faults.json"); }
     void everyRequestUnder()
     {
         QFETCH(QJsonObject, row);
@@ -250,15 +227,17 @@ private slots:
         QVERIFY2(m_longestGap < kLongestGapMs, qPrintable(QString::number(m_longestGap)));
     }
 
-    void backgroundRequestsEnd_data() { addRowsOfItsOwn("endlessreplies.json"); }
+    void backgroundRequestsEnd_data() { fixture::addRows("endlessreplies.json"); }
     void backgroundRequestsEnd()
     {
         QFETCH(QJsonObject, row);
         const QJsonObject action = row["action"].toObject();
-        startAnswered();
+        const bool drips = action.contains("drip_ms");
+        serve("before", 2);
+        start();
+        QTRY_VERIFY_WITH_TIMEOUT(known().startsWith("before|N1|PC|before 3 "), kPatienceMs);
         setFault({}, action);
-        if (action.contains("drip_ms"))
-            QNotification::qInstance->setTimeLimit(std::chrono::seconds(1));
+        QNotification::qInstance->setTimeLimit(drips ? 1s : zent::http::kBackgroundTime);
         const long before = memory("VmRSS");
         testfiles::write("/proc/self/clear_refs", "5");
         m_platform.addFault({{"path", "*/remove"}}, {{"hang", true}});
@@ -268,9 +247,8 @@ private slots:
         // Nobody takes in what comes while the window is held up.
         HttpRequest::GetInstance()->postQuitControl("zhangsan");
         QTRY_COMPARE_WITH_TIMEOUT(QNotification::qInstance->pendingRequests(), 0, kPatienceMs);
-        QNotification::qInstance->setTimeLimit(zent::http::kBackgroundTime);
         QVERIFY2(log.contains(row["reason"].toString()), qPrintable(log.lines().join('\n')));
-        if (!action.contains("drip_ms")) {
+        if (!drips) {
             m_window->getusrInfo();
             m_window->getAllUserEnvironment();
             const auto ended = [&log] {
@@ -280,95 +258,6 @@ private slots:
         }
         QVERIFY2(memory("VmHWM") - before < 40 * 1024, qPrintable(QString::number(memory("VmHWM") - before)));
         QTRY_VERIFY_WITH_TIMEOUT(memory("VmRSS") - before < 4 * 1024, 60000);
-    }
-
-    void aSlowServerBlocksLittle_data() { addRowsOfItsOwn("slowservers.json"); }
-    void aSlowServerBlocksLittle()
-    {
-        QFETCH(QJsonObject, row);
-        const int delay = row["delay"].toInt();
-        setFault({}, {{"delay_ms", delay}, {"status", 503}});
-        serve("slow", 0);
-        m_window = std::make_unique<MainWindow>(nullptr, 1020);
-        m_host = std::make_unique<SessionHost>(*m_window);
-        m_platform.clearRecord();
-        const auto polls = [this] {
-            int count = 0;
-            for (const QJsonObject& request : m_platform.record("http"))
-                count += request.value("path").toString().startsWith("/uim/") ? 1 : 0;
-            return count;
-        };
-        QElapsedTimer time;
-        time.start();
-        QTRY_COMPARE_WITH_TIMEOUT(polls(), 3, kPatienceMs + 30 * delay);
-        // The third has just begun: two have blocked, and were followed by two pauses.
-        QVERIFY2(2 * delay < time.elapsed() * 15 / 100, qPrintable(QString::number(time.elapsed())));
-        setFault({}, {});
-        QTRY_COMPARE_WITH_TIMEOUT(known().section(' ', 0, 0), QString("slow|N1|PC|slow"), 35000);
-    }
-
-    void namesAreCheckedOnASlowServer()
-    {
-        setFault({}, {{"delay_ms", 400}});
-        m_platform.patchState({{"pc_name_rules", QJsonObject{{"regular_expression", ""}}}});
-        HttpRequest* client = HttpRequest::GetInstance();
-        client->getUserInfo("zhangsan");
-        client->getCaCert("server.zent.test", "443");
-        QString message;
-        QVERIFY2(client->checkPcName("free-name", message), qPrintable(message));
-        QVERIFY(!client->checkPcName(QStringLiteral("研发中心-终端-001"), message));
-    }
-
-    void theAuthorityIsFollowed()
-    {
-        const QByteArray authority = testfiles::read(testfiles::kAuthorityFile);
-        const QByteArray info = testfiles::read(testfiles::kInfoFile);
-        QJsonObject https = QJsonDocument::fromJson(info).object();
-        https.insert("protocol", "https");
-        https.insert("server_host", "server.zent.test");
-        https.insert("server_port", 443);
-        testfiles::write(testfiles::kInfoFile, QJsonDocument(https).toJson());
-        QNotification client;
-        testfiles::write(testfiles::kInfoFile, info);
-        const auto answered = [&client] {
-            std::optional<bool> result;
-            client.getNotifyMessageList("zhangsan", true, 1, 1, [&](bool ok, const auto&) { result = ok; });
-            [&] { QTRY_VERIFY_WITH_TIMEOUT(result.has_value(), kPatienceMs); }();
-            // The reply goes with its deletion.
-            QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
-            nextSecond();
-            return result;
-        };
-        const QByteArray contents[] = {
-            authority, testfiles::read("/run/room/tls/unknown_ca.crt"), authority, {}, authority};
-        QList<bool> results;
-        for (const QByteArray& content : contents) {
-            testfiles::write(testfiles::kAuthorityFile, content);
-            if (content.isEmpty())
-                testfiles::remove(testfiles::kAuthorityFile);
-            results.append(answered() == true);
-        }
-        testfiles::write(testfiles::kAuthorityFile, authority);
-        QCOMPARE(results, (QList<bool>{true, false, true, false, true}));
-    }
-
-    void cookiesAreNotSent()
-    {
-        startAnswered();
-        m_platform.addFault({{"path", "*"}}, {{"headers", QJsonObject{{"Set-Cookie", "a=b; Path=/"}}}});
-        m_platform.clearRecord();
-        for (int i = 0; i < 2; ++i) {
-            nextSecond();
-            askEverything();
-            QTRY_COMPARE_WITH_TIMEOUT(QNotification::qInstance->pendingRequests(), 0, kPatienceMs);
-        }
-        const QList<QJsonObject> requests = m_platform.record("http");
-        QVERIFY(requests.size() > 8);
-        for (const QJsonObject& request : requests) {
-            const QJsonObject headers = request.value("headers").toObject();
-            QVERIFY2(!headers.contains("cookie") && headers.value("accept-encoding") == "identity",
-                     qPrintable(request.value("path").toString()));
-        }
     }
 };
 

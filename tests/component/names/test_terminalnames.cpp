@@ -1,15 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pcnamerules.h"
 
-#include <QRandomGenerator>
 #include <QtTest>
 
 #include <ctime>
 
 namespace
 {
-
-constexpr int kLongestName = 255;
 
 /// Processor time: the machine may be busy with something else.
 double millisecondsSpent()
@@ -18,65 +15,6 @@ double millisecondsSpent()
     clock_gettime(CLOCK_THREAD_CPUTIME_ID, &now);
     return static_cast<double>(now.tv_sec) * 1e3 + static_cast<double>(now.tv_nsec) / 1e6;
 }
-
-/// A rule and a name that fits it.
-struct Sample {
-    QString rule;
-    QString name;
-};
-
-class SampleMaker
-{
-public:
-    explicit SampleMaker(int seed) : m_random(static_cast<quint32>(seed)) {}
-
-    /// A rule that is let through, with a name of 255 characters.
-    Sample make()
-    {
-        Sample sample;
-        do {
-            sample = group(3);
-            const int left = kLongestName - sample.name.size();
-            if (left > 0)
-                sample = joined(sample, {pick({"[a-z0-9-]{1,255}", "[^!]+", "(\\w|-)*"}), QString(left, 'z')});
-            if (pick(2) == 0)
-                sample.rule = pick({"^", "^(?!-)", "^(?=[a-z])"}) + sample.rule + '$';
-        } while (sample.name.size() != kLongestName || !zent::isBearableRule(sample.rule));
-        return sample;
-    }
-
-private:
-    int pick(int bound) { return m_random.bounded(bound); }
-    QString pick(std::initializer_list<const char*> texts)
-    {
-        return QString::fromUtf8(texts.begin()[pick(static_cast<int>(texts.size()))]);
-    }
-    static Sample joined(const Sample& a, const Sample& b) { return {a.rule + b.rule, a.name + b.name}; }
-    Sample part(int depth)
-    {
-        Sample result{pick({"a", ".", "[a-z0-9]", "[^-]", "(a|b|.)", "(?:x|a?)"}), "a"};
-        if (depth > 0 && pick(2) == 0) {
-            result = group(depth - 1);
-            result.rule = '(' + result.rule + ')';
-        }
-        return result;
-    }
-    Sample group(int depth)
-    {
-        Sample result;
-        for (int parts = 1 + pick(4); parts > 0; --parts) {
-            const Sample one = part(depth);
-            const int most = 1 << pick(8);
-            const int times = 1 + pick(most);
-            const QString counted = QString("{%1,%2}").arg(pick(2)).arg(most);
-            const QString quantifier = times == 1 ? pick({"", "?", "*", "+"}) : pick(2) ? counted : pick({"*", "+"});
-            result = joined(result, {one.rule + quantifier, one.name.repeated(times)});
-        }
-        return result;
-    }
-
-    QRandomGenerator m_random;
-};
 
 } // namespace
 
@@ -105,19 +43,20 @@ private slots:
             QVERIFY2(zent::isBearableRule(rule) == bearable, qPrintable(rule));
     }
 
-    void generatedRules()
+    void slowRules()
     {
-        for (int seed = 0; seed < 200; ++seed) {
-            const Sample sample = SampleMaker(seed).make();
-            const QString nearly = sample.name.left(kLongestName - 1) + '!';
+        // The slowest that were met among many thousands, of those that are let through.
+        for (const char* rule : {"^(([^-]?){1,32})+[^!]+$", "[a-z0-9]*(a*(a|b|.)+([^-]{0,8}){1,16})?.+(\\w|-)*",
+                                 "(.*[a-z0-9]{0,128})+(a|b|.)*.{0,128}(\\w|-)*",
+                                 "(.?){1,16}(.+(a|b|.)*[a-z0-9]{0,4}){0,2}(.{1,128}[^-]{1,2})*[a-z0-9-]{1,255}",
+                                 "^(?!-).{0,2}[a-z0-9]+((?:x|a?){1,8}(?:x|a?)+.{0,8})*[a-z0-9-]{1,255}$",
+                                 "((?:x|a?)+(?:x|a?)[^-]{0,64}(a|b|.)?)+(\\w|-)*",
+                                 "^(?=[a-z])([a-z0-9]?((.{0,32})(a|b|.)+a+)*)[^-]*[^!]+$"}) {
+            QVERIFY2(zent::matchPcName(rule, QString(255, 'a')).whole, rule);
             const double began = millisecondsSpent();
-            const zent::PcNameMatch match = zent::matchPcName(sample.rule, sample.name);
-            const double between = millisecondsSpent();
-            zent::matchPcName(sample.rule, nearly);
-            const double ended = millisecondsSpent();
-            QVERIFY2(match.whole, qPrintable(sample.rule + '\n' + sample.name));
-            const double longest = std::max(between - began, ended - between);
-            QVERIFY2(longest < 100, qPrintable(QString("%1 ms: %2").arg(longest).arg(sample.rule)));
+            zent::matchPcName(rule, QString(254, 'a') + '!');
+            const double spent = millisecondsSpent() - began;
+            QVERIFY2(spent < 100, qPrintable(QString("%1 ms: %2").arg(spent).arg(rule)));
         }
     }
 };

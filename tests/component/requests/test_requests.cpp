@@ -15,7 +15,9 @@ const QString kName = QStringLiteral("张 三&x=1");
 const QString kPassword = QStringLiteral("Pass\"word\\ 密");
 
 /// The status and reply that no server would give by itself.
-const QJsonObject kReply{{"status", 207}, {"body", QStringLiteral("die Antwort 答复")}};
+const QJsonObject kReply{{"status", 207},
+                         {"body", QStringLiteral("die Antwort 答复")},
+                         {"headers", QJsonObject{{"Set-Cookie", "a=b; Path=/"}}}};
 
 } // namespace
 
@@ -217,6 +219,39 @@ private slots:
         const LogCapture log;
         QCOMPARE(FileConfig::GetInstance()->getMacAddress(), row["mac"].toString());
         fixture::compareLog(log, row["log"]);
+    }
+
+    void theAuthoritysFileIsFollowed()
+    {
+        const QByteArray authority = testfiles::read(testfiles::kAuthorityFile);
+        const QByteArray contents[] = {authority, testfiles::read("/run/room/tls/unknown_ca.crt"), authority, {}};
+        m_platform.clearFaults();
+        m_platform.addFault({{"path", "*"}}, {{"body", "[]"}});
+        QList<bool> results;
+        for (const QByteArray& content : contents) {
+            testfiles::write(testfiles::kAuthorityFile, content);
+            // Requests within one second share their URL and thus their callback.
+            m_messages->getNotifyMessageList(kName, true, 1, 10 + results.size(),
+                                             [&](bool ok, const auto&) { results.append(ok); });
+            QTRY_COMPARE(m_messages->pendingRequests(), 0);
+            // The reply goes with its deletion.
+            QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
+        }
+        testfiles::write(testfiles::kAuthorityFile, authority);
+        QCOMPARE(results, QList<bool>({true, false, true, false}));
+    }
+
+    void aSlowServerIsPolledLess()
+    {
+        m_platform.clearFaults();
+        m_platform.addFault({{"path", "*"}}, {{"delay_ms", 250}, {"status", 207}});
+        m_signals = {};
+        m_server->getUserInfo(kName);
+        m_server->getCompanyName();
+        m_server->getUserInfo(kName);
+        m_server->postQuitControl(kName);
+        fixture::compare(
+            m_signals, QJsonArray{"sigUserInfo 207 ", "sigCompanyName -4 ", "sigUserInfo -4 ", "sigQuitControl 207 "});
     }
 };
 

@@ -1,13 +1,43 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixture.h"
+#include "httprules.h"
 #include "lookups.h"
 #include "private/hostguard.h"
+
+#include <QNetworkAccessManager>
+#include <QNetworkProxy>
+
+namespace
+{
+
+/// How long each timer of the guard that runs does so, shortest first.
+QList<int> running(const HostGuard& guard)
+{
+    QList<int> intervals;
+    for (const QTimer* timer : guard.findChildren<QTimer*>()) {
+        if (timer->isActive())
+            intervals.append(timer->interval());
+    }
+    std::sort(intervals.begin(), intervals.end());
+    return intervals;
+}
+
+} // namespace
 
 class TestHostGuard : public QObject
 {
     Q_OBJECT
 
 private slots:
+    void initTestCase()
+    {
+        const QStringList paths = QCoreApplication::libraryPaths();
+        zent::http::leaveOutBearers();
+        QCOMPARE(QCoreApplication::libraryPaths(), paths);
+        const QNetworkAccessManager second;
+        QVERIFY2(!testfiles::read("/proc/self/maps").contains("bearer"), "a plugin was loaded");
+    }
+
     /// Milliseconds of polls that were answered, or what came instead.
     void pollsAreHeldBackFor_data() { fixture::addRows("heldbackpolls.json"); }
     void pollsAreHeldBackFor()
@@ -23,20 +53,48 @@ private slots:
                                                : HostGuard::Outcome::Answered,
                        7);
             if (poll != "met" && poll != "unknown")
-                guard.notePollTime(std::chrono::milliseconds(poll.toInt(2000)), 7);
+                guard.notePollTime(std::chrono::milliseconds(poll.toInt(1900)), 8);
         }
-        QCOMPARE(guard.objection(), row["objection"].toString());
-        QVERIFY(guard.objection().isEmpty() || guard.failure() == 7);
+        const QString objection = guard.objection();
+        QCOMPARE(objection, row["objection"].toString());
+        QCOMPARE(running(guard), objection.startsWith("no connection") ? QList<int>{2000} : QList<int>());
+        if (!objection.isEmpty())
+            QCOMPARE(guard.failure(), row["failure"].toInt());
         fixture::compareLog(log, row["log"]);
+    }
+
+    void unreachableHostIsTriedLessAndLess()
+    {
+        // No packet is sent there.
+        HostGuard guard("255.255.255.255", 1);
+        guard.note(HostGuard::Outcome::ConnectTimedOut, 7);
+        for (const int interval : {2000, 4000, 8000, 16000, 30000, 30000}) {
+            // Another time-out changes nothing.
+            guard.note(HostGuard::Outcome::ConnectTimedOut, 7);
+            QList<QTimer*> timers = guard.findChildren<QTimer*>();
+            if (timers[0]->interval() != interval)
+                std::swap(timers[0], timers[1]);
+            QCOMPARE(timers[0]->interval(), interval);
+            QVERIFY(QMetaObject::invokeMethod(timers[0], "timeout"));
+            QCOMPARE(running(guard), QList<int>({1500, std::min(2 * interval, 30000)}));
+            // The attempt has its time.
+            QVERIFY(QMetaObject::invokeMethod(timers[1], "timeout"));
+            QCOMPARE(running(guard), QList<int>({std::min(2 * interval, 30000)}));
+            QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
+            QCOMPARE(guard.children().size(), 2);
+        }
+        QCOMPARE(guard.objection(), QString("no connection to 255.255.255.255:1 so far"));
     }
 
     void aRefusalShowsThatTheHostIsThere()
     {
+        QNetworkProxy::setApplicationProxy(QNetworkProxy(QNetworkProxy::HttpProxy, "127.0.0.1", 9));
         // Nobody listens there.
         HostGuard guard("127.0.0.1", 1);
         guard.note(HostGuard::Outcome::ConnectTimedOut, 7);
         QVERIFY(!guard.objection().isEmpty());
         QTRY_COMPARE(guard.objection(), QString());
+        QCOMPARE(running(guard), QList<int>());
     }
 
     void lookUpsAreCounted()

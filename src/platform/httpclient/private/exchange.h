@@ -17,9 +17,9 @@ namespace zent::http
 struct Result {
     QNetworkReply::NetworkError error = QNetworkReply::NoError;
     /// In words for the log, when `error` is one.
-    QString reason;
-    int status = 0;
-    QByteArray body;
+    QString reason = {};
+    int status = {};
+    QByteArray body = {};
 };
 
 /// One request and what has become of it, shared by the thread that waits and the thread that speaks. What is asked

@@ -29,8 +29,6 @@ constexpr auto kLongestSlowHold = 30s;
 
 HostGuard::HostGuard(const QString& host, quint16 port, QObject* parent) : QObject(parent), m_host(host), m_port(port)
 {
-    m_nextTry.setSingleShot(true);
-    m_tryLimit.setSingleShot(true);
     connect(&m_nextTry, &QTimer::timeout, this, &HostGuard::startTry);
     connect(&m_tryLimit, &QTimer::timeout, this, &HostGuard::endTry);
 }
@@ -133,10 +131,10 @@ void HostGuard::connectTo(const QList<QHostAddress>& addresses)
         auto* socket = new QTcpSocket(this);
         m_sockets.push_back(socket);
         socket->setProxy(QNetworkProxy::NoProxy);
-        connect(socket, &QTcpSocket::connected, this, [this] { note(Outcome::Met, 0); });
+        connect(socket, &QTcpSocket::connected, this, &HostGuard::answersAgain);
         connect(socket, &QTcpSocket::errorOccurred, this, [this](QAbstractSocket::SocketError error) {
             if (error == QAbstractSocket::ConnectionRefusedError)
-                note(Outcome::Met, 0);
+                answersAgain();
         });
         socket->connectToHost(address, m_port);
         // A refusal may be known at once.

@@ -62,8 +62,8 @@ private:
     std::chrono::milliseconds m_holdPeriod{0};
     QDeadlineTimer m_heldUntil;
     std::chrono::milliseconds m_tryInterval{0};
-    QTimer m_nextTry;
-    QTimer m_tryLimit;
+    QTimer m_nextTry{this};
+    QTimer m_tryLimit{this};
     int m_lookup = -1;
     std::vector<QTcpSocket*> m_sockets;
 };

@@ -66,8 +66,6 @@ void HttpThread::start()
 
 void HttpThread::abandon(const std::shared_ptr<Exchange>& exchange)
 {
-    if (!m_state)
-        return;
     const std::lock_guard lock(m_state->mutex);
     if (!m_state->ended)
         QMetaObject::invokeMethod(

@@ -23,7 +23,7 @@ public:
 
     /// Has the exchange done; starts the thread where there is none.
     void send(const std::shared_ptr<Exchange>& exchange);
-    /// Ends an exchange that nobody waits for any more.
+    /// Ends an exchange that was sent and that nobody waits for any more.
     void abandon(const std::shared_ptr<Exchange>& exchange);
     /// Ends the thread, and with it what is under way.
     void stop();

@@ -51,14 +51,13 @@ private:
 /// What tells one server from another.
 QString serverOf(const QUrl& url)
 {
-    return url.scheme() + QLatin1String("://") + url.authority();
+    return url.scheme() + url.authority();
 }
 
 } // namespace
 
 Speaker::Speaker(std::function<void()> onIdle) : m_idle(this)
 {
-    m_idle.setSingleShot(true);
     m_idle.setInterval(kIdleTime);
     m_idle.callOnTimeout(this, std::move(onIdle));
 }
@@ -76,7 +75,7 @@ void Speaker::send(const std::shared_ptr<Exchange>& exchange)
     if (exchange->url.scheme() == QLatin1String("https")) {
         readTlsFiles(exchange->tls);
         if (!m_tlsProblem.isEmpty())
-            return end({QNetworkReply::OperationCanceledError, m_tlsProblem, 0, {}});
+            return end({QNetworkReply::OperationCanceledError, m_tlsProblem});
     }
     if (m_answered.count(serverOf(exchange->url)) > 0)
         noteConnected();
@@ -146,7 +145,7 @@ void Speaker::finish()
     QString reason = failureOf(reply);
     if (!m_peerProblem.isEmpty())
         reason += QLatin1String(": ") + m_peerProblem;
-    end({isTooLarge(reply) ? QNetworkReply::UnknownContentError : reply->error(), reason, 0, {}});
+    end({isTooLarge(reply) ? QNetworkReply::UnknownContentError : reply->error(), reason});
 }
 
 void Speaker::end(Result result)
