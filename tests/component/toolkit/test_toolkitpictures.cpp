@@ -1,7 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixture.h"
-#include "themehelper.h"
-#include "toolkitblurframe.h"
+#include "description.h"
 #include "toolkitbuttonbox.h"
 #include "toolkitcombobox.h"
 #include "toolkitdialog.h"
@@ -12,9 +10,6 @@
 #include "toolkittitlebar.h"
 #include "toolkittoolbutton.h"
 #include "toolkitwarningbutton.h"
-
-#include <QMenu>
-#include <QPainter>
 
 #include <functional>
 
@@ -49,6 +44,20 @@ class TestToolkitPictures : public QObject
         return bar;
     }
 
+    static QWidget* box(QWidget*)
+    {
+        auto* dialog = new ToolkitDialog;
+        dialog->setIcon(icon());
+        dialog->setTitle("标题");
+        dialog->setMessage("文字");
+        dialog->addContent(new ToolkitLineEdit, Qt::AlignRight);
+        dialog->addButton("A&B", true);
+        dialog->addButton("建议", false, ToolkitDialog::ButtonRecommend);
+        dialog->addButton("警告", false, ToolkitDialog::ButtonWarning);
+        dialog->setSurface(ThemeHelper::DarkType);
+        return dialog;
+    }
+
     static QWidget* make(const QString& kind, QWidget* parent)
     {
         static const std::map<QString, std::function<QWidget*(QWidget*)>> kMakers{
@@ -65,6 +74,7 @@ class TestToolkitPictures : public QObject
             {"spinner", [](QWidget* parent) { return new ToolkitSpinner(parent); }},
             {"surface", [](QWidget* parent) { return new ToolkitBlurFrame(parent); }},
             {"dialog", [](QWidget*) { return new ToolkitDialog; }},
+            {"message box", box},
             {"line", [](QWidget* parent) { return new ToolkitFrame(parent); }},
         };
         return kMakers.at(kind)(parent);
@@ -176,6 +186,17 @@ private slots:
         const QString got = QDir::tempPath() + "/" + QFileInfo(name).fileName();
         const bool same = expected.size() == strip.size() && differences(strip, expected) == 0;
         QVERIFY2(same || !strip.save(got), qPrintable("not as in tests/data/" + name + ", but as in " + got));
+    }
+
+    // What the toolkit's widgets are made of before anybody changes them.
+    void parts_data() { fixture::addRows("toolkitparts.json"); }
+    void parts()
+    {
+        QFETCH(QJsonObject, row);
+        QWidget window;
+        window.setPalette(ThemeHelper::palette(ThemeHelper::LightType));
+        const std::unique_ptr<QWidget> widget(make(QTest::currentDataTag(), &window));
+        description::compare(widget.get(), row["widgets"]);
     }
 
     void palettes()

@@ -10,8 +10,12 @@
 #include "toolkitspinner.h"
 #include "toolkitsuggestbutton.h"
 #include "toolkittitlebar.h"
+#include "toolkittoolbutton.h"
+#include "toolkitwarningbutton.h"
 
 #include <QAbstractButton>
+#include <QAbstractItemView>
+#include <QAccessible>
 #include <QAction>
 #include <QClipboard>
 #include <QHelpEvent>
@@ -37,8 +41,7 @@ bool shown(QWidget& window)
 QString toolTip(QWidget& widget)
 {
     QHelpEvent event(QEvent::ToolTip, QPoint(1, 1), QPoint(1, 1));
-    QApplication::sendEvent(&widget, &event);
-    return event.isAccepted() ? QToolTip::text() : QString();
+    return QApplication::sendEvent(&widget, &event) && event.isAccepted() ? QToolTip::text() : QString();
 }
 
 QFont font(int pixels)
@@ -47,6 +50,18 @@ QFont font(int pixels)
     font.setPixelSize(pixels);
     return font;
 }
+
+class PaintCounter : public QObject
+{
+public:
+    explicit PaintCounter(QObject* watched) : QObject(watched) { watched->installEventFilter(this); }
+    bool eventFilter(QObject*, QEvent* event) override
+    {
+        count += event->type() == QEvent::Paint ? 1 : 0;
+        return false;
+    }
+    int count = 0;
+};
 
 } // namespace
 
@@ -70,48 +85,46 @@ private slots:
         QCOMPARE(others.count(), 1);
     }
 
-    void messageIsLiteralAndWhole()
+    void messagesAreLiteralAndWhole_data() { fixture::addRows("messages.json"); }
+    void messagesAreLiteralAndWhole()
     {
-        for (const QString& message : {QString("<b>错误</b>"), "https://" + QString(300, 'a'), QString(500, '\n')}) {
-            ToolkitDialog dialog;
-            dialog.setMessage(message);
-            dialog.addButton("确定", true);
-            QVERIFY(shown(dialog));
-            QCOMPARE(dialog.message(), message);
-            auto* label = dialog.findChild<QLabel*>("messageLabel");
-            QCOMPARE(label->textFormat(), Qt::PlainText);
-            QVERIFY(dialog.width() >= 300 && dialog.width() < 500 && dialog.height() < 1200);
-            QVERIFY(!label->geometry().intersects(dialog.buttons().constFirst()->geometry()));
-            QTest::mouseClick(label, Qt::LeftButton);
-            QTest::keyClick(label, Qt::Key_A, Qt::ControlModifier);
-            QTest::keyClick(label, Qt::Key_C, Qt::ControlModifier);
-            QCOMPARE(QGuiApplication::clipboard()->text(),
-                     message.count('\n') < 20 ? message : QString(19, '\n') + "…");
-            // The menu copies the whole message while nothing is selected.
-            label->setSelection(0, 0);
-            QCOMPARE(label->actions().constFirst()->text(), QString("复制"));
-            label->actions().constFirst()->trigger();
-            QCOMPARE(QGuiApplication::clipboard()->text(), message);
-        }
-    }
-
-    void longWordsAreBroken()
-    {
+        QFETCH(QJsonObject, row);
+        const QString message = row["begin"].toString() + row["text"].toString().repeated(row["times"].toInt(1));
+        ToolkitDialog dialog;
+        auto* label = dialog.findChild<QLabel*>("messageLabel");
+        label->setFont(font(14));
+        dialog.setMessage(message);
+        dialog.addButton("确定", true);
+        QVERIFY(shown(dialog));
+        QCOMPARE(dialog.message(), message);
+        QTest::mouseClick(label, Qt::LeftButton);
+        QTest::keyClick(label, Qt::Key_A, Qt::ControlModifier);
+        QTest::keyClick(label, Qt::Key_C, Qt::ControlModifier);
+        const QString copied = QGuiApplication::clipboard()->text();
+        QVERIFY(message == copied || message.startsWith(copied.left(copied.size() - 1)));
         // A combining mark and the second half of a pair stay where they are.
-        const std::pair<QString, QList<int>> rows[] = {{QString(24, 'a'), {24}},
-                                                       {QString(25, 'a'), {24, 1}},
-                                                       {QString(49, 'a'), {24, 24, 1}},
-                                                       {QString(23, 'a') + " " + QString(24, 'a'), {48}},
-                                                       {QString('a') + QString("𝐀").repeated(13), {25, 2}},
-                                                       {QString(24, 'a') + QChar(0x301) + "a", {25, 1}}};
-        for (const auto& [message, pieces] : rows) {
-            ToolkitDialog dialog;
-            dialog.setMessage(message);
-            QList<int> got;
-            for (const QString& piece : dialog.findChild<QLabel*>("messageLabel")->text().split(QChar(0x200b)))
-                got.append(piece.size());
-            QCOMPARE(got, pieces);
+        QJsonArray pieces;
+        for (const QString& piece : label->text().split(QChar(0x200b)))
+            pieces.append(piece.size());
+        QJsonObject got{{"pieces", pieces}, {"copied", copied.size()}, {"end", copied.right(1)}};
+        if (row["shown"].toObject().contains("width"))
+            got["width"] = label->width();
+        fixture::compare(got, row["shown"]);
+        QVERIFY(!label->geometry().intersects(dialog.buttons().constFirst()->geometry()));
+        // The menu copies the whole message while nothing is selected.
+        label->setSelection(0, 0);
+        label->actions().constFirst()->trigger();
+        QCOMPARE(QGuiApplication::clipboard()->text(), message);
+        if (row.contains("larger")) {
+            QLabel plain(label->text());
+            plain.setFont(label->font());
+            plain.setWordWrap(true);
+            QCOMPARE(label->height(), plain.heightForWidth(label->width()) + 20);
+            label->setFont(font(20));
+            QCOMPARE(label->width(), row["larger"].toInt());
         }
+        dialog.setMessage("");
+        QVERIFY(!label->isVisible());
     }
 
     void buttonsFitTheirTexts()
@@ -123,21 +136,44 @@ private slots:
             QCOMPARE(button.sizeHint(), QSize(width, 36));
         }
         ToolkitPushButton button("█");
-        button.setFont(font(100));
-        const int line = button.fontMetrics().height();
-        QCOMPARE(button.sizeHint(), QSize(button.fontMetrics().size(0, "█").width() + 32, line + 12));
-        QCOMPARE(button.minimumSizeHint(), QSize(0, line + 4));
-        ToolkitSuggestButton accented("█");
-        const QPalette palette = ThemeHelper::palette(ThemeHelper::LightType);
-        for (QPushButton* one : {static_cast<QPushButton*>(&button), static_cast<QPushButton*>(&accented)}) {
-            one->setPalette(palette);
+        ToolkitButtonBoxButton segment("█");
+        for (QAbstractButton* one : {static_cast<QAbstractButton*>(&button), static_cast<QAbstractButton*>(&segment)})
             one->setFont(font(100));
-            one->resize(one->sizeHint());
-            const auto ink = [one] { return one->grab().toImage().pixelColor(one->rect().center()); };
-            QCOMPARE(ink(), one == &accented ? QColor(Qt::white) : palette.color(QPalette::ButtonText));
-            one->setEnabled(false);
-            QCOMPARE(ink(), palette.color(QPalette::Disabled, QPalette::ButtonText));
+        const QSize glyph = button.fontMetrics().size(0, "█");
+        QCOMPARE(button.sizeHint(), glyph + QSize(32, 12));
+        QCOMPARE(segment.sizeHint(), glyph + QSize(32, 14));
+        QCOMPARE(button.minimumSizeHint(), QSize(0, glyph.height() + 4));
+        ToolkitToolButton tool;
+        tool.setText("█");
+        tool.setFont(font(20));
+        tool.resize(200, 30);
+        for (const auto& [alignment, x] :
+             {std::pair{Qt::AlignHCenter, 100}, {Qt::AlignLeft, 8}, {Qt::AlignRight, 191}}) {
+            tool.setTextAlignment(alignment | Qt::AlignTop);
+            for (const int column : {8, 100, 191})
+                QCOMPARE(tool.grab().toImage().pixelColor(column, 15).lightness() < 128, column == x);
         }
+    }
+
+    void buttonsHaveTheirColours_data() { fixture::addRows("buttoncolours.json"); }
+    void buttonsHaveTheirColours()
+    {
+        QFETCH(QJsonObject, row);
+        const std::unique_ptr<QPushButton> buttons[] = {
+            std::make_unique<ToolkitPushButton>("█"), std::make_unique<ToolkitSuggestButton>("█"),
+            std::make_unique<ToolkitWarningButton>("█"), std::make_unique<ToolkitSuggestButton>()};
+        QJsonArray got;
+        for (const auto& button : buttons) {
+            button->setPalette(ThemeHelper::palette(ThemeHelper::LightType));
+            button->setFont(font(100));
+            button->resize(button->sizeHint());
+            button->setEnabled(!row["disabled"].toBool());
+            button->setDown(row["down"].toBool());
+            button->setAttribute(Qt::WA_UnderMouse, row["hovered"].toBool());
+            const QImage image = button->grab().toImage();
+            got.append(image.pixelColor(button->rect().center()).name() + image.pixelColor(8, 18).name());
+        }
+        fixture::compare(got, row["colours"]);
     }
 
     void titleBarDragsItsWindow()
@@ -147,20 +183,26 @@ private slots:
         QVERIFY(shown(window));
         window.move(100, 100);
         const QSignalSpy dragged(bar, &ToolkitTitlebar::windowDragged);
+        // Sends an event of the mouse, and returns whether the bar takes it.
         const auto mouse = [bar](QEvent::Type type, const QPoint& place, Qt::MouseButton button = Qt::NoButton) {
             QMouseEvent event(type, bar->mapFromGlobal(place), place, button, Qt::LeftButton, Qt::NoModifier);
             QApplication::sendEvent(bar, &event);
+            return event.isAccepted();
         };
+        QVERIFY(!mouse(QEvent::MouseMove, {200, 200}));
+        QVERIFY(!mouse(QEvent::MouseButtonPress, {110, 110}, Qt::RightButton));
         mouse(QEvent::MouseMove, {200, 200});
-        mouse(QEvent::MouseButtonPress, {110, 110}, Qt::RightButton);
-        mouse(QEvent::MouseMove, {200, 200});
-        mouse(QEvent::MouseButtonPress, {110, 110}, Qt::LeftButton);
-        mouse(QEvent::MouseMove, QPoint(109 + QApplication::startDragDistance(), 110));
-        QCOMPARE(window.pos(), QPoint(100, 100));
-        QCOMPARE(dragged.count(), 0);
-        mouse(QEvent::MouseMove, {150, 140});
+        for (const int distance : {QApplication::startDragDistance() - 1, QApplication::startDragDistance()}) {
+            const int before = dragged.count();
+            window.move(100, 100);
+            QVERIFY(mouse(QEvent::MouseButtonPress, {110, 110}, Qt::LeftButton));
+            mouse(QEvent::MouseMove, QPoint(110, 110 + distance));
+            const bool drags = distance == QApplication::startDragDistance();
+            QCOMPARE(window.pos(), QPoint(100, drags ? 100 + distance : 100));
+            QCOMPARE(dragged.count() - before, drags ? 1 : 0);
+        }
         mouse(QEvent::MouseMove, {160, 150});
-        mouse(QEvent::MouseButtonRelease, {160, 150}, Qt::LeftButton);
+        QVERIFY(!mouse(QEvent::MouseButtonRelease, {160, 150}, Qt::LeftButton));
         mouse(QEvent::MouseMove, {200, 200});
         QCOMPARE(window.pos(), QPoint(150, 140));
         QCOMPARE(dragged.count(), 1);
@@ -185,6 +227,9 @@ private slots:
         auto* echoButton = edit->findChild<QAbstractButton*>("echoButton");
         QTest::mouseClick(echoButton, Qt::LeftButton);
         QCOMPARE(edit->displayText(), secret);
+        QTest::keyClick(edit, Qt::Key_X, Qt::ControlModifier);
+        QCOMPARE(clipboard->text() + edit->text(), secret);
+        edit->setText(secret);
         edit->setClearIcon(QIcon(QPixmap(8, 8)));
         QTest::mouseClick(edit->findChild<QAbstractButton*>("clearButton"), Qt::LeftButton);
         QTest::keySequence(edit, QKeySequence::Undo);
@@ -202,19 +247,14 @@ private slots:
         auto* clear = edit.findChild<QAbstractButton*>("clearButton");
         edit.resize(200, 36);
         QVERIFY(shown(edit));
-        const auto hints = [&edit] { return int(edit.inputMethodHints()); };
-        constexpr int kSecret = Qt::ImhSensitiveData | Qt::ImhNoPredictiveText | Qt::ImhNoAutoUppercase;
-        QCOMPARE(hints(), kSecret | Qt::ImhHiddenText);
-        QCOMPARE(echo->toolTip() + echo->accessibleDescription(), QString("显示密码 (Ctrl+R)Ctrl+R"));
         QTest::keyClick(&edit, Qt::Key_R, Qt::ControlModifier);
-        QCOMPARE(hints(), kSecret);
-        QCOMPARE(echo->accessibleName() + echo->isChecked(), QString("隐藏密码") + true);
-        QVERIFY(!edit.testAttribute(Qt::WA_InputMethodEnabled) && !clear->isVisible());
+        QCOMPARE(edit.inputMethodHints(), Qt::ImhSensitiveData | Qt::ImhNoPredictiveText | Qt::ImhNoAutoUppercase);
+        QCOMPARE(echo->accessibleName(), QString("隐藏密码"));
+        QVERIFY(echo->isChecked() && !edit.testAttribute(Qt::WA_InputMethodEnabled) && !clear->isVisible());
         edit.setText("secret");
         QVERIFY(!clear->isVisible());
         edit.setClearIcon(QIcon(QPixmap(8, 8)));
         QVERIFY(clear->isVisible());
-        QCOMPARE(clear->accessibleName(), QString("清空"));
         QCOMPARE(echo->geometry(), QRect(168, 4, 28, 28));
         QCOMPARE(clear->geometry(), QRect(140, 4, 28, 28));
         QCOMPARE(edit.textMargins(), QMargins(8, 0, 60, 0));
@@ -247,22 +287,20 @@ private slots:
         edit.showAlertMessage(row["message"].toString(), row["ms"].toInt(3000));
         const auto* timer = edit.findChild<QTimer*>(QString(), Qt::FindDirectChildrenOnly);
         QCOMPARE(timer->isActive(), row["ms"].toInt(3000) > 0);
-        const auto* bubble = window.findChildren<QLabel*>("alertBubble").last();
+        auto* bubble = window.findChildren<QLabel*>("alertBubble").last();
         QCOMPARE(edit.alertMessage(), row["message"].toString());
         QCOMPARE(bubble->text(), row["shown"].toString(row["message"].toString()));
         const QRect field = edit.geometry();
         const QRect got = bubble->geometry();
-        QVERIFY(bubble->isVisible() && window.rect().contains(got));
-        if (row.contains("width"))
-            QCOMPARE(got.width(), row["width"].toInt());
-        const bool inside = field.contains(got);
+        QVERIFY(bubble->isVisible() && window.rect().contains(got) && window.children().last() == bubble);
+        QCOMPARE(bubble->grab().toImage().pixelColor(got.width() / 2, 2), QColor(0xb3, 0x26, 0x1e));
+        QCOMPARE(fixture::text(QJsonArray{got.left(), got.width()}), fixture::text(row["bubble"]));
+        const bool inside = field.contains(got) && got.center().y() == field.center().y();
         QCOMPARE(inside                            ? "inside"
                  : got.top() == field.bottom() + 5 ? "below"
                  : got.bottom() == field.top() - 5 ? "above"
                                                    : "",
                  row["place"].toString());
-        QVERIFY(inside ? got.right() == field.right() - 8 && got.center().y() == field.center().y()
-                       : got.left() == field.left());
         edit.setText("a text so long that no bubble has room behind it");
         QCOMPARE(field.contains(bubble->geometry()), false);
         edit.move(field.x() + 3, field.y());
@@ -282,9 +320,7 @@ private slots:
             step();
             QCOMPARE(timer->isActive(), turns);
         }
-        QCOMPARE(timer->interval(), 80);
         QCOMPARE(spinner.sizeHint(), QSize(20, 20));
-        QCOMPARE(spinner.accessibleName(), QString("正在处理"));
     }
 
     void labelsFit()
@@ -302,8 +338,9 @@ private slots:
             QCOMPARE(label.font().pixelSize(), pixels);
         }
         const std::tuple<int, bool, const char*> rows[] = {
-            {200, false, ""}, {20, true, ""}, {20, false, "终端别名终端别名"}};
+            {112, false, ""}, {111, false, "终端别名终端别名"}, {20, true, ""}, {20, false, "终端别名终端别名"}};
         for (const auto& [width, wraps, tip] : rows) {
+            label.setFont(font(14));
             label.resize(width, 18);
             label.setWordWrap(wraps);
             QCOMPARE(toolTip(label), QString(tip));
@@ -313,12 +350,23 @@ private slots:
         QCOMPARE(ToolkitLabel::plainToolTip("a < b"), "a < b");
         QCOMPARE(ToolkitLabel::plainToolTip("<b>a</b>"), "&lt;b&gt;a&lt;/b&gt;");
         ToolkitComboBox box;
-        box.addItem("a scene of a long name");
-        box.resize(60, 36);
-        QVERIFY(shown(box));
-        QCOMPARE(toolTip(box), "a scene of a long name");
-        box.resize(400, 36);
-        QCOMPARE(toolTip(box), QString());
+        box.setFont(font(14));
+        box.addItem("<b>终</b>");
+        box.addItem("终端别名终端别名");
+        box.resize(20, 36);
+        QCOMPARE(toolTip(box), "&lt;b&gt;终&lt;/b&gt;");
+        box.setCurrentIndex(1);
+        for (const auto& [width, tip] : {std::pair{153, "终端别名终端别名"}, {154, ""}}) {
+            box.resize(width, 36);
+            QCOMPARE(toolTip(box), QString(tip));
+        }
+        box.setPalette(ThemeHelper::palette(ThemeHelper::DarkType));
+        box.showPopup();
+        for (const auto group : {QPalette::Active, QPalette::Inactive, QPalette::Disabled}) {
+            for (int role = 0; role < QPalette::NColorRoles; ++role)
+                QCOMPARE(box.view()->palette().color(group, QPalette::ColorRole(role)),
+                         box.palette().color(group, QPalette::ColorRole(role)));
+        }
     }
 
     void segmentsAreReplaced()
@@ -349,12 +397,11 @@ private slots:
         auto* button = bar.findChild<QToolButton*>(QString(), Qt::FindDirectChildrenOnly);
         QVERIFY(shown(bar) && bar.autoFillBackground() && !button->isVisible());
         bar.setMenu(new QMenu(&bar));
-        QVERIFY(button->isVisible() && button->popupMode() == QToolButton::InstantPopup);
+        QVERIFY(button->isVisible());
         bar.setMenuVisible(false);
         QVERIFY(!button->isVisible());
         bar.setBackgroundTransparent(true);
         QVERIFY(!bar.autoFillBackground());
-        QCOMPARE(button->toolTip(), QString("菜单"));
         QTest::mouseClick(bar.findChild<QToolButton*>("titlebarCloseButton"), Qt::LeftButton);
         QVERIFY(!bar.isVisible());
     }
@@ -365,32 +412,38 @@ private slots:
         QVERIFY(shown(dialog));
         QCOMPARE(dialog.focusWidget()->objectName(), "titlebarCloseButton");
         dialog.hide();
-        const std::tuple<const char*, bool, ToolkitDialog::ButtonType, const char*> kinds[] = {
-            {"a&b", false, ToolkitDialog::ButtonNormal, "ToolkitPushButton"},
-            {"c", false, ToolkitDialog::ButtonRecommend, "ToolkitSuggestButton"},
-            {"d", true, ToolkitDialog::ButtonWarning, "ToolkitWarningButton"}};
-        int index = 0;
-        for (const auto& [text, isDefault, type, name] : kinds) {
-            QCOMPARE(dialog.addButton(text, isDefault, type), index);
-            auto* button = qobject_cast<QPushButton*>(dialog.buttons()[index++]);
-            QCOMPARE(button->metaObject()->className(), name);
-            QCOMPARE(button->accessibleName(), text);
-            QCOMPARE(button->text(), QString(text).replace("&", "&&"));
-            QVERIFY(button->isDefault() == isDefault && !button->autoDefault());
+        for (const char* name : {"disabled", "hidden", "clicked", "first", "second"}) {
+            auto* edit = new QLineEdit;
+            edit->setObjectName(name);
+            edit->setEnabled(*name != 'd');
+            edit->setFocusPolicy(*name == 'c' ? Qt::ClickFocus : Qt::StrongFocus);
+            dialog.addContent(edit);
+            edit->setHidden(*name == 'h');
         }
+        auto* other = new QPushButton;
+        dialog.addContent(other);
+        // Shows the dialog again, and returns what has the focus.
+        const auto focus = [&dialog](QWidget* former) {
+            dialog.hide();
+            former->clearFocus();
+            return shown(dialog) ? dialog.focusWidget() : nullptr;
+        };
+        QCOMPARE(focus(dialog.focusWidget())->objectName(), "first");
+        QVERIFY(!other->autoDefault());
+        for (const int index : {0, 1})
+            QCOMPARE(dialog.addButton("a", index == 1), index);
+        dialog.setWindowFlags(Qt::Widget);
+        QCOMPARE(focus(dialog.focusWidget()), dialog.buttons()[1]);
+        QVERIFY(dialog.windowFlags().testFlag(Qt::FramelessWindowHint) && dialog.isWindow());
+        dialog.setTitle("title");
+        QVERIFY(dialog.accessibleName().isEmpty());
+        dialog.setTitle("");
         dialog.setMessage("message");
         QCOMPARE(dialog.accessibleName() + dialog.accessibleDescription(), "message");
-        dialog.setTitle("title");
-        QCOMPARE(dialog.accessibleName() + dialog.accessibleDescription(), "titlemessage");
-        for (QWidget* former : {dialog.focusWidget(), static_cast<QWidget*>(dialog.buttons()[2])})
-            former->clearFocus();
-        dialog.setWindowFlags(Qt::Widget);
-        QVERIFY(shown(dialog));
-        QCOMPARE(dialog.focusWidget(), dialog.buttons()[2]);
-        QVERIFY(dialog.windowFlags().testFlag(Qt::FramelessWindowHint) && dialog.isWindow());
         const QSignalSpy chosen(&dialog, &ToolkitDialog::buttonClicked);
         QTest::keyClick(&dialog, Qt::Key_Enter);
-        QCOMPARE(chosen.count() + dialog.result(), 1 + 2);
+        QCOMPARE(chosen.count(), 1);
+        QCOMPARE(dialog.result(), 1);
         QVERIFY(shown(dialog));
         QTest::keyClick(&dialog, Qt::Key_Escape);
         QVERIFY(!dialog.isVisible());
@@ -402,25 +455,68 @@ private slots:
         auto* edit = new QLineEdit(&frame);
         auto* button = new ToolkitPushButton("一", &frame);
         auto* panel = new ToolkitBlurFrame(&frame);
-        QCOMPARE(frame.radius(), 12);
-        QCOMPARE(frame.maskAlpha(), 230);
-        QCOMPARE(frame.maskColor(), QColor(0xfa, 0xfa, 0xfb));
         for (const auto& [alpha, kept] : {std::pair{-1, 0}, {300, 255}}) {
             frame.setMaskAlpha(alpha);
             QCOMPARE(frame.maskAlpha(), kept);
         }
+        for (const auto& [grey, type] : {std::pair{127, ThemeHelper::DarkType}, {128, ThemeHelper::LightType}}) {
+            frame.setMaskColor(QColor(grey, grey, grey));
+            QCOMPARE(frame.maskColor().red(), grey);
+            QCOMPARE(frame.palette(), ThemeHelper::palette(type));
+        }
+        QCOMPARE(QAccessible::queryAccessibleInterface(&frame)->role(), QAccessible::Window);
+        QVERIFY(QAccessible::queryAccessibleInterface(panel)->role() != QAccessible::Window);
         const QSignalSpy clicked(button, &QAbstractButton::clicked);
         QVERIFY(shown(frame));
-        edit->setFocus();
-        QTest::keyClick(edit, Qt::Key_Return);
-        QCOMPARE(clicked.count(), 0);
-        for (const Qt::Key key : {Qt::Key_Return, Qt::Key_Enter, Qt::Key_A}) {
-            button->setFocus();
-            QTest::keyClick(&frame, key);
+        const std::tuple<QWidget*, Qt::Key, int, bool> rows[] = {{edit, Qt::Key_Return, 0, false},
+                                                                 {button, Qt::Key_Return, 1, true},
+                                                                 {button, Qt::Key_Enter, 2, true},
+                                                                 {button, Qt::Key_A, 2, false},
+                                                                 {panel, Qt::Key_Escape, 2, true}};
+        for (const auto& [focused, key, clicks, taken] : rows) {
+            focused == panel ? frame.setFocus() : focused->setFocus();
+            QKeyEvent event(QEvent::KeyPress, key, Qt::NoModifier);
+            QApplication::sendEvent(focused == panel ? panel : &frame, &event);
+            QCOMPARE(event.isAccepted(), taken);
+            QCOMPARE(clicked.count(), clicks);
         }
-        QCOMPARE(clicked.count(), 2);
-        QTest::keyClick(panel, Qt::Key_Escape);
         QVERIFY(!frame.isVisible() && panel->isVisibleTo(&frame));
+    }
+
+    void changesAreDrawn()
+    {
+        ToolkitBlurFrame frame;
+        ToolkitToolButton tool(&frame);
+        ToolkitPasswordEdit edit(&frame);
+        ToolkitSpinner spinner(&frame);
+        QVERIFY(shown(frame));
+        const QSignalSpy alerts(&edit, &ToolkitLineEdit::alertChanged);
+        const std::pair<QWidget*, std::function<void()>> changes[] = {
+            {&frame, [&] { frame.setMaskColor(Qt::white); }},
+            {&frame, [&] { frame.setMaskAlpha(3); }},
+            {&frame, [&] { frame.setRadius(3); }},
+            {&tool, [&] { tool.setIconTinted(true); }},
+            {&tool, [&] { tool.setTextAlignment(Qt::AlignLeft); }},
+            {&edit, [&] { edit.setAlert(true); }},
+            {&spinner, [&] { spinner.start(); }}};
+        for (const auto& [widget, change] : changes) {
+            QTest::qWait(0);
+            const PaintCounter counter(widget);
+            change();
+            QTRY_VERIFY2(counter.count > 0, widget->metaObject()->className());
+        }
+        edit.setAlert(true);
+        edit.showAlertMessage("wrong");
+        QCOMPARE(alerts.count(), 1);
+        QVERIFY(edit.isAlert());
+        // A window that only the desktop hides keeps the bubble.
+        for (const bool spontaneous : {true, false}) {
+            QHideEvent hidden;
+            if (spontaneous)
+                QSpontaneKeyEvent::setSpontaneous(&hidden);
+            qApp->notify(&edit, &hidden);
+            QCOMPARE(edit.alertMessage(), spontaneous ? "wrong" : "");
+        }
     }
 };
 
