@@ -12,6 +12,7 @@
 #include "networkdaemonproxy.h"
 #include "noticedialog.h"
 #include "notification.h"
+#include "notify.h"
 #include "platformcontrol.h"
 #include "processrecord.h"
 #include "sessionhost.h"
@@ -261,6 +262,10 @@ private slots:
             QTRY_COMPARE(appeared.count(), 1);
             QVERIFY(log.records().contains("info TrayHostWatch a tray host is there"));
             QCOMPARE(m_window->findChild<QSystemTrayIcon*>() != nullptr, !ended);
+            // Of a tray that shows no balloons, or of none.
+            emit host.findChild<Notification*>()->onMessage(1, "", "title", "text", "sender");
+            QTRY_VERIFY(log.records().contains(
+                "warning SessionHost neither a notification service nor a tray shows the message"));
         }
         const auto* icon = m_window->findChild<QSystemTrayIcon*>();
         QCOMPARE(icon->toolTip(), QStringLiteral("终端域管平台"));
@@ -289,13 +294,11 @@ private slots:
         QCOMPARE(m_window->system(""), -1);
         const QStringList pieces{x.left(127),     x.left(127),     x.left(46), middle.left(42),
                                  middle.left(42), middle.left(16), "a"};
-        QStringList got = m_window->commandOutputLines();
-        QCOMPARE(got.takeLast(), QString("a") + QChar(QChar::ReplacementCharacter));
-        QCOMPARE(got, pieces.mid(0, 6));
         QStringList lines;
         for (const QString& piece : pieces)
             lines.append("debug system \"" + piece + '"');
         QCOMPARE(log.records(), lines);
+        QCOMPARE(m_window->commandOutputLines(), pieces.mid(0, 6) << QString("a") + QChar(QChar::ReplacementCharacter));
         // A child that somebody else has waited for, and no descriptor for the pipe.
         const auto handler = std::signal(SIGCHLD, SIG_IGN);
         QCOMPARE(m_window->system("true"), -3);
@@ -349,20 +352,17 @@ private slots:
 
     void placingGoesOnWhileThePanelIsShown()
     {
-        const auto intervals = [this] {
-            QList<int> found;
+        QList<int> intervals;
+        for (const bool shown : {true, false}) {
+            m_window->setVisible(shown);
+            m_window->resetUIPos();
+            intervals.clear();
             for (const QTimer* timer : m_window->findChildren<QTimer*>())
-                found += timer->isActive() ? timer->interval() : 0;
-            return found;
-        };
-        m_window->show();
-        m_window->resetUIPos();
-        QVERIFY(intervals().contains(1000));
-        // The date's.
-        QVERIFY(intervals().contains(1000000));
-        m_window->hide();
-        m_window->resetUIPos();
-        QVERIFY(!intervals().contains(1000));
+                intervals += timer->isActive() ? timer->interval() : 0;
+            QCOMPARE(intervals.contains(1000), shown);
+        }
+        // The date's goes on.
+        QVERIFY(intervals.contains(1000000));
     }
 
     void linksOpenTheirDialogs()
@@ -387,8 +387,6 @@ private slots:
                 dialog->hide();
             }
         }
-        QCOMPARE(m_window->findChildren<closeGuarddialog*>().size(), 1);
-        QCOMPARE(m_window->findChildren<ModifyDialog*>().size(), 1);
         QCOMPARE(log.records().count("debug closeguard get username : \"zhangsan\""), 2);
         emit m_window->findChild<closeGuarddialog*>()->closeall();
         QVERIFY(m_window->isHidden());
@@ -485,13 +483,11 @@ private slots:
         makeWindow(3);
         m_window->openNotice();
         QTRY_COMPARE(next()->text(), QStringLiteral("下一条(3)"));
-        QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 2 %2"));
         QSignalSpy read(m_window.get(), &MainWindow::readNotify);
         next()->click();
         QVERIFY(!next()->isEnabled());
         QTRY_COMPARE(next()->text(), QStringLiteral("下一条(2)"));
         QCOMPARE(read, QList<QVariantList>{{"2"}});
-        read.clear();
         QVERIFY(next()->isEnabled());
         QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 1 %2"));
 
@@ -508,9 +504,8 @@ private slots:
         next()->click();
         QTRY_COMPARE(boxes.texts.size(), 1);
         QVERIFY2(boxes.texts.constFirst().startsWith("消息调用警告Error"), qPrintable(boxes.texts.constFirst()));
-        QVERIFY(logged);
         QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
-        QVERIFY(read.isEmpty() && !next()->isEnabled());
+        QVERIFY(logged && read.size() == 1 && !next()->isEnabled());
         QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 1 %2"));
         m_platform.clearFaults();
         m_window->onReadListMessage("other");
@@ -554,15 +549,12 @@ private slots:
         m_platform.addFault(kNetworkDaemon, {{"error", "com.vantor.Error.Failed"}});
         makeWindow(0);
         HttpRequest::GetInstance()->onUserInfo(200, R"({"code": 0, "data": {"user": {"gecos": "A,,,1"}}})");
-        const auto person = [this] { return page("terminalValue").at(2).toString(); };
-        const auto address = [this] { return page("hostValue").at(3).toString(); };
-        QCOMPARE(person(), QString());
-        QCOMPARE(address(), QString());
+        const auto shown = [this] { return QJsonArray{page("terminalValue").at(2), page("hostValue").at(3)}; };
+        fixture::compare(shown(), QJsonArray{"", ""});
         m_platform.clearFaults();
         m_platform.clearRecord();
         m_window->show();
-        QCOMPARE(person(), QString("A"));
-        QCOMPARE(address(), QString("10.20.30.117"));
+        fixture::compare(shown(), QJsonArray{"A", "10.20.30.117"});
         m_window->hide();
         m_window->show();
         QCOMPARE(m_platform.record("dbus").size(), 1);
