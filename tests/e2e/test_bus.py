@@ -13,11 +13,6 @@ SERVICE = "com.vantor.tarn"
 NOTIFICATION = "/com/vantor/tarn/Notification"
 FULLZONE = "/com/vantor/tarn/Fullzone"
 OBJECTS = {NOTIFICATION: "com.vantor.tarn.Notification", FULLZONE: "com.vantor.tarn.Fullzone"}
-# A value of every basic type of D-Bus, and of every kind of container.
-SAMPLES = {signature: GLib.Variant(signature, value) for signature, value in {
-    "y": 7, "b": True, "n": -7, "q": 7, "i": -7, "u": 7, "x": -7, "t": 7, "d": 0.5, "s": "success", "o": "/a", "g": "as",
-    "h": 0, "v": GLib.Variant("s", "open"), "as": ["true"], "ay": b"\xff\0", "(si)": ("a", 1), "a{sv}": {},
-    "a(ov)": [("/", GLib.Variant("v", GLib.Variant("h", 0)))], "av": [GLib.Variant("d", float("nan"))] * 100}.items()}
 
 
 def gdbus(*arguments):
@@ -29,21 +24,16 @@ def notification(method, *arguments):
                  "com.vantor.tarn.Notification." + method, *arguments)
 
 
-def described_methods(interface):
-    """The types of each method's arguments."""
-    described = ElementTree.fromstring(read(os.path.join(TREE, "data", interface + ".xml"))).find("interface")
-    return {method.get("name"): [argument.get("type") for argument in method.findall("arg")]
-            for method in described.findall("method")}
+def interfaces(path, text):
+    """The object's own interfaces, and their members with the arguments' types and directions."""
+    own = [i for i in ElementTree.fromstring(text).findall("interface") if ".freedesktop.DBus." not in i.get("name")]
 
+    def arguments(member):
+        return [(a.get("type"), member.tag == "signal" or a.get("direction")) for a in member.findall("arg")]
 
-def wrong_signatures(types):
-    """Each argument as every other type, all of them as one type, and too few or too many arguments."""
-    for index in range(len(types)):
-        yield from (types[:index] + [other] + types[index + 1:] for other in SAMPLES if other != types[index])
-    yield from ([other] * len(types) for other in SAMPLES if [other] * len(types) != types)
-    yield from (types[:count] for count in range(len(types)))
-    yield from (types + [more] for more in SAMPLES)
-    yield types * 30
+    # A signal's arguments can only go out, whether that is written or not.
+    return path, [(i.get("name"), sorted((m.tag, m.get("name"), arguments(m)) for m in i if m.tag != "annotation"))
+                  for i in own]
 
 
 class Bus(ClientTest):
@@ -53,41 +43,16 @@ class Bus(ClientTest):
         self.until("the name on the bus", lambda: gdbus("introspect", "--session", "-d", SERVICE, "-o",
                                                         NOTIFICATION).returncode == 0)
 
-    def members(self, introspection, interface):
-        """What an object offers beside the bus's own interfaces, which must be this interface alone."""
-        own = [i for i in ElementTree.fromstring(introspection).findall("interface")
-               if not i.get("name").startswith("org.freedesktop.DBus.")]
-        self.assertEqual([i.get("name") for i in own], [interface])
-        # A signal's arguments can only go out, whether that is written or not.
-        return sorted((m.tag, m.get("name"), [(a.get("type"), m.tag == "signal" or a.get("direction"))
-                                              for a in m.findall("arg")]) for m in own[0] if m.tag != "annotation")
-
     def test_objects_offer_what_their_files_describe_and_nothing_else(self):
-        for path, name in OBJECTS.items():
-            live = gdbus("introspect", "--session", "--xml", "-d", SERVICE, "-o", path).stdout
-            described = self.members(read(os.path.join(TREE, "data", name + ".xml")), name)
-            self.assertEqual(self.members(live, name), described)
-
-    def test_calls_with_other_types_and_counts_are_refused(self):
         bus = Gio.bus_get_sync(Gio.BusType.SESSION)
-        before = self.desktop.windows()
-        calls = 0
-        for path, interface in OBJECTS.items():
-            for method, types in described_methods(interface).items():
-                for signature in wrong_signatures(types):
-                    calls += 1
-                    arguments = GLib.Variant.new_tuple(*map(SAMPLES.get, signature)) if signature else None
-                    message = Gio.DBusMessage.new_method_call(SERVICE, path, interface, method)
-                    message.set_unix_fd_list(Gio.UnixFDList.new_from_array([os.dup(0)]))
-                    message.set_body(arguments or GLib.Variant("()", ()))
-                    reply, _ = bus.send_message_with_reply_sync(message, 0, 5000, None)
-                    self.assertEqual((reply.get_error_name() or "").rpartition(".")[2], "UnknownMethod",
-                                     (method, signature))
-        self.assertGreater(calls, 300)
-        self.assertEqual(notification("AgencyNotify", "a", "b").stdout, "()\n")
-        self.assertEqual(self.desktop.windows(), before)
+        other_type = GLib.Variant("(v)", (GLib.Variant("s", "open"),))
+        for path, name in OBJECTS.items():
+            live = interfaces(path, gdbus("introspect", "--session", "--xml", "-d", SERVICE, "-o", path).stdout)
+            self.assertEqual(live, interfaces(path, read(os.path.join(TREE, "data", name + ".xml"))))
+            for method in (member[1] for member in live[1][0][1] if member[0] == "method"):
+                with self.assertRaisesRegex(GLib.Error, "UnknownMethod", msg=method):
+                    bus.call_sync(SERVICE, path, name, method, other_type, None, 0, 5000, None)
         self.assertEqual(roomclient.record("process", name="gio"), [])
-        self.assertIsNone(self.client.poll())
 
     def test_pushed_message_is_announced_once(self):
         with subprocess.Popen(["gdbus", "monitor", "--session", "-d", SERVICE, "-o", NOTIFICATION],

@@ -22,9 +22,6 @@ class Once(ClientTest):
         """Presses the keys where the focus is, within 400 ms."""
         self.desktop.run("xdotool", "key", "--delay", "100", *keys)
 
-    def asked(self, **match):
-        return roomclient.record(**match)
-
     def answered(self, text, before):
         self.until(text, lambda: sum(text in line for line in roomclient.syslog_lines()) > before)
 
@@ -42,7 +39,8 @@ class Once(ClientTest):
         # What is typed after the answer counts again.
         self.press("Escape")
         self.stage.gone(dialog)
-        self.assertEqual([entry["args"][1:] for entry in self.asked(method="ModifyUserPassword")], [["old", "new"]] * 2)
+        calls = roomclient.record(method="ModifyUserPassword")
+        self.assertEqual([call["args"][1:] for call in calls], [["old", "new"]] * 2)
 
     def test_terminal_is_released_and_rebooted_once(self):
         roomclient.add_fault({"path": "*/remove_status"}, {"body": '{"code": 1, "msg": "no"}', "delay_ms": 1200})
@@ -55,7 +53,7 @@ class Once(ClientTest):
         roomclient.clear_faults()
         self.stage.keys(box, "Escape")
         self.stage.gone(box)
-        self.assertEqual(len(self.asked(path="/uim/v3/client/remove_status")), 1)
+        self.assertEqual(len(roomclient.record(path="/uim/v3/client/remove_status")), 1)
 
         roomclient.add_fault({"dbus": "Reboot"}, {"error": "com.vantor.Error.Busy", "delay_ms": 1500})
         self.stage.type(dialog, "Admin@2026")
@@ -65,13 +63,13 @@ class Once(ClientTest):
         roomclient.wait_record(lambda entry: entry.get("path") == "/uim/v3/client/remove")
         for round_ in range(2):
             self.desktop.click(*reboot)
-            self.until("the call", lambda wanted=round_ + 1: len(self.asked(method="Reboot")) == wanted)
+            self.until("the call", lambda wanted=round_ + 1: len(roomclient.record(method="Reboot")) == wanted)
             self.desktop.click(*reboot)
             self.press("space", "Return", "Return")
             self.answered("warning [ spinerwin.cpp", round_)
         self.press("Escape")
         self.stage.gone(spinner)
-        self.assertEqual(len(self.asked(method="Reboot")), 2)
+        self.assertEqual(len(roomclient.record(method="Reboot")), 2)
 
 
 if __name__ == "__main__":

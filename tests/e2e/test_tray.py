@@ -1,7 +1,7 @@
 # SPDX-License-Identifier: Apache-2.0
 """The tray icon and the panel on a real X server with a real tray host and window manager."""
 
-from clienttest import SYSLOG, ClientTest, roomclient, unittest, write
+from clienttest import ClientTest, roomclient, unittest
 
 from stage import Stage
 
@@ -11,22 +11,14 @@ SCREEN = (1280, 800)
 class Tray(ClientTest):
     def test_clicks(self):
         self.start()
-        self.desktop.click_icon(repeat=2)
-        roomclient.wait_syslog("reason : 2")
-        self.desktop.click_icon(button=2)
-        roomclient.wait_syslog("reason : 4")
-        # The double click counted once, and the first click shows nothing.
+        # The double click counts once, and the first click shows nothing.
+        for times, reason in (({"repeat": 2}, 2), ({"button": 2}, 4)):
+            self.desktop.click_icon(**times)
+            roomclient.wait_syslog(f"reason : {reason}")
         self.assertEqual(sum("winstatus" in line for line in roomclient.syslog_lines()), 1)
         self.assertIsNone(self.desktop.panel())
-        self.desktop.click_icon()
-        self.desktop.wait("the panel", self.desktop.panel)
         # A right click makes the next left click show.
-        self.desktop.click_icon(button=3)
-        roomclient.wait_syslog("reason : 1")
-        write(SYSLOG, b"")
-        self.desktop.click_icon()
-        roomclient.wait_syslog("reason : 3")
-        self.assertIsNotNone(self.desktop.panel())
+        self.show_panel()
         self.desktop.click_icon()
         self.wait_hidden()
 

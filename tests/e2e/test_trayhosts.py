@@ -1,5 +1,5 @@
 # SPDX-License-Identifier: Apache-2.0
-"""When the tray icon appears on desktops of either tray protocol, and what clicks on it do where Qt does not see them.
+"""When the tray icon appears on desktops of either tray protocol.
 
     test_trayhosts.py ROOM CLIENT
 
@@ -54,9 +54,6 @@ class HostTest(ClientTest):
         with open(f"/proc/{self.client.pid}/status", encoding="ascii") as stream:
             return int(next(line for line in stream if line.startswith("voluntary")).split()[1])
 
-    def count(self, text):
-        return sum(text in line for line in roomclient.syslog_lines())
-
 
 class XembedHost(HostTest):
     def start_host(self):
@@ -108,31 +105,7 @@ class LateNotifier(Late, NotifierHost):
 
 
 class Notifier(Soon, NotifierHost):
-    def test_balloon_goes_to_the_missing_service_too(self):
-        self.start_host()
-        self.start()
-        self.wait_icon()
-        gdbus("com.vantor.tarn", "/com/vantor/tarn/Notification", "com.vantor.tarn.Notification.Notify",
-              "1", "", "a", "b", "c")
-        roomclient.wait_syslog("neither a notification service nor a tray shows the message")
-
-    def test_clicks(self):
-        self.start_host()
-        self.start()
-        item = f"org.kde.StatusNotifierItem-{self.client.pid}-1"
-        for name, times, reason, toggles in (("left", {}, 3, 1), ("middle", {"button": 2}, 4, 1),
-                                             ("double", {"repeat": 2}, 2, 2)):
-            with self.subTest(name):
-                self.desktop.click_icon(**times)
-                roomclient.wait_syslog(f"reason : {reason}")
-                self.assertEqual(self.count("winstatus"), toggles)
-        self.desktop.wait("the panel", self.desktop.panel)
-        # This host keeps right clicks to itself; others hand them on.
-        gdbus(item, "/StatusNotifierItem", "org.kde.StatusNotifierItem.ContextMenu", "0", "0")
-        roomclient.wait_syslog("reason : 1")
-        gdbus(item, "/StatusNotifierItem", "org.kde.StatusNotifierItem.Activate", "0", "0")
-        self.until("the click", lambda: self.count("winstatus") == 3)
-        self.assertIsNotNone(self.desktop.panel())
+    pass
 
 
 class Registry(NotifierHost):

@@ -1,22 +1,31 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "boxcloser.h"
 #include "childprocess.h"
+#include "closeguarddialog.h"
+#include "dbusnames.h"
+#include "fileconfig.h"
 #include "fixture.h"
 #include "httprequest.h"
 #include "infowidget.h"
 #include "mainwindow.h"
+#include "modifydialog.h"
+#include "networkdaemonproxy.h"
 #include "noticedialog.h"
 #include "notification.h"
+#include "notify.h"
 #include "platformcontrol.h"
 #include "processrecord.h"
 #include "sessionhost.h"
+#include "sizedicon.h"
 #include "toolkittitlebar.h"
 #include "trayhost.h"
 #include "trayregistry.h"
 
+#include <QAbstractButton>
 #include <QApplication>
 #include <QCheckBox>
 #include <QComboBox>
+#include <QDBusConnectionInterface>
 #include <QLabel>
 #include <QLayout>
 #include <QNetworkAccessManager>
@@ -25,8 +34,9 @@
 #include <QPushButton>
 #include <QScreen>
 #include <QSignalSpy>
-#include <QSystemTrayIcon>
 
+#include <csignal>
+#include <sys/resource.h>
 #include <unistd.h>
 
 namespace
@@ -34,6 +44,7 @@ namespace
 
 const QString kSceneFile = QString("/home/zhangsan/.cache/vantor/CurrentScene");
 const QString kListPath = QStringLiteral("/notification/v2/list");
+const QJsonObject kNetworkDaemon{{"dbus", "GetActiveConnectionInfo"}};
 
 } // namespace
 
@@ -44,7 +55,15 @@ class TestMainWindow : public QObject
     PlatformControl m_platform;
     std::unique_ptr<MainWindow> m_window;
 
-    QString shown(const char* label) const { return m_window->findChild<QLabel*>(label)->text(); }
+    /// The values of the panel's page that has this one among them.
+    QJsonArray page(const char* value) const
+    {
+        QJsonArray values;
+        const auto labels = m_window->findChild<QLabel*>(value)->parentWidget()->findChildren<QLabel*>();
+        for (int i = 1; i < labels.size(); i += 2)
+            values.append(labels[i]->text());
+        return values;
+    }
     void analyseScenes(const QStringList& names)
     {
         QJsonArray scenes;
@@ -53,18 +72,47 @@ class TestMainWindow : public QObject
         QByteArray body = QJsonDocument(QJsonObject{{"code", 0}, {"message", scenes}}).toJson();
         QCOMPARE(m_window->analyseEvnData(&body), 1);
     }
+    void click(const char* button) const { m_window->findChild<QAbstractButton*>(button)->click(); }
     QComboBox* sceneBox() const { return m_window->findChild<QComboBox*>(); }
     NoticeDialog* notice() const { return m_window->findChild<NoticeDialog*>(); }
     QPushButton* first() const { return notice()->firstButton(); }
     QPushButton* next() const { return notice()->nextButton(); }
     QString shownTitle() const { return notice()->findChildren<QPlainTextEdit*>().first()->toPlainText(); }
+    /// The texts of the message dialog, with what else each view and button is.
+    QJsonArray noticeContent(const QString& time) const
+    {
+        QJsonArray content;
+        for (const QLabel* label : notice()->findChildren<QLabel*>()) {
+            if (!label->text().isEmpty())
+                content.append(label->text().replace(QNotification::formatTime(time, true), "TIME"));
+        }
+        for (const QPlainTextEdit* view : notice()->findChildren<QPlainTextEdit*>()) {
+            QStringList words{view->toPlainText()};
+            for (const char* property : {"objectName", "accessibleName", "readOnly", "tabChangesFocus", "frameShape",
+                                         "verticalScrollBarPolicy", "horizontalScrollBarPolicy", "height"})
+                words.append(view->property(property).toString());
+            for (const int number : {view->font().pixelSize(), view->font().weight(), int(view->wordWrapMode()),
+                                     int(view->viewport()->autoFillBackground())})
+                words.append(QString::number(number));
+            content.append(words.join(' '));
+        }
+        for (const QPushButton* button : {first(), next()})
+            content.append(button->isVisible() ? button->text() + QString(" %1").arg(button->width()) : "hidden");
+        return content;
+    }
+    QPoint centred(const QWidget& window) const
+    {
+        const QSize rest = QGuiApplication::primaryScreen()->size() - window.size();
+        return {rest.width() / 2, rest.height() / 2};
+    }
     /// Requests within one second share their URL and thus their callback.
     static void nextSecond() { QTest::qWait(1001 - QTime::currentTime().msec()); }
+    void startNetworkDaemon() { m_platform.patchState({{"services", QJsonObject{{"network", true}}}}); }
     void makeWindow(int unread)
     {
         m_platform.setUnread(unread);
         MainWindow::unreadMessageCount = 0;
-        m_window = std::make_unique<MainWindow>(nullptr, 1020);
+        m_window = std::make_unique<MainWindow>(nullptr, 1029);
     }
 
 private slots:
@@ -78,12 +126,12 @@ private slots:
 
     void whatThePiecesFindReachesPanelAndSignals()
     {
+        HttpRequest::GetInstance()->onCompanyName(200, R"({"code": 0, "data": {"name": "O"}})");
         HttpRequest::GetInstance()->onUserInfo(
             500, R"({"code": 0, "data": {"user": {"gecos": "A,,,1", "client_name": "PC"}}})");
-        HttpRequest::GetInstance()->onCompanyName(200, R"({"code": 0, "data": {"name": "O"}})");
-        m_window->onLogininfoClicked();
-        QCOMPARE(shown("macValue") + shown("userRoleValue") + shown("terminalValue"), QString("A1PC"));
-        QCOMPARE(m_window->findChildren<QLabel*>("nameValue").first()->text(), QString("O"));
+        QJsonArray login = page("terminalValue");
+        login.removeLast(); // The time.
+        fixture::compare(login, QJsonArray{"PC", "O", "A", "1", ""});
         QSignalSpy spy(m_window.get(), &MainWindow::newMessage);
         m_platform.setUnread(2);
         nextSecond();
@@ -94,23 +142,18 @@ private slots:
         QCOMPARE(MainWindow::unreadMessageCount, 1);
         m_window->onReadAllMessage();
         QCOMPARE(MainWindow::unreadMessageCount, 0);
-    }
 
-    void areaReplyDecidesOnTheScenes()
-    {
-        QNetworkAccessManager manager;
-        for (const int status : {200, 404}) {
-            m_platform.addFault({{"path", "/any"}},
-                                {{"status", status}, {"body", R"({"code": 0, "data": [{"name": "N"}]})"}});
-            QNetworkReply* reply = manager.get(QNetworkRequest(QUrl("http://server.zent.test/any")));
-            QTRY_VERIFY(reply->isFinished());
-            m_platform.clearRecord();
-            m_window->rcvAreainfoData(reply);
-            QTRY_COMPARE(m_platform.requests("/api/client/area/scenes").size(), status == 200 ? 1 : 0);
-            QTRY_COMPARE(sceneBox()->isHidden(), status != 200);
-        }
+        m_platform.clearRecord();
         emit m_window->startgetMeInfo();
         QCOMPARE(m_platform.requests("/uim/v3/client/account").size(), 1);
+        QByteArray area = R"({"code": 0, "data": [{"name": "N"}]})";
+        m_window->analyseAreaData(&area);
+        QTRY_VERIFY(!sceneBox()->isHidden());
+        QNetworkAccessManager manager;
+        QNetworkReply* failed = manager.get(QNetworkRequest(QUrl("http://server.zent.test/none")));
+        QTRY_VERIFY(failed->isFinished());
+        m_window->rcvAreainfoData(failed);
+        QVERIFY(sceneBox()->isHidden());
     }
 
     void choiceOfSceneIsTheUsers()
@@ -131,37 +174,75 @@ private slots:
         }
         testfiles::write(kSceneFile, "untouched");
         m_window->reverseEvn();
-        QCOMPARE(testfiles::read(kSceneFile), QByteArray("untouched"));
         QCOMPARE(sceneBox()->currentText(), QStringLiteral("丙"));
+        // A session starts with the first scene, which the box lacks.
+        m_window->getUserName();
+        m_window->reverseEvn();
+        QCOMPARE(sceneBox()->currentIndex(), -1);
+        QCOMPARE(testfiles::read(kSceneFile), QByteArray("untouched"));
     }
 
-    void panelThatTheClientPlacedKeepsItsCorner()
+    void placesOfPanelAndDialog()
     {
         m_window->show();
-        emit m_window->findChild<ToolkitTitlebar*>()->windowDragged();
-        m_window->move(10, 10);
-        m_window->findChild<QCheckBox*>("onTop")->click();
-        QVERIFY(m_window->windowFlags().testFlag(Qt::WindowStaysOnTopHint));
-        const QPoint placed = m_window->geometry().bottomRight();
-        analyseScenes({"甲", "乙"});
-        QCOMPARE(m_window->geometry().bottomRight(), placed);
-    }
-
-    void changeOfScreensLeavesTheUsersPlace()
-    {
-        m_window->show();
+        const QRect screen = QGuiApplication::primaryScreen()->geometry();
         const QPoint corner = m_window->pos();
-        const auto placeAfter = [this](const QPoint& place) {
-            m_window->move(place);
+        QCOMPARE(m_window->geometry().bottomRight(), screen.bottomRight());
+        const auto placesAfter = [this](const QPoint& panel, const QPoint& dialog) {
+            m_window->move(panel);
+            notice()->move(dialog);
             emit QGuiApplication::primaryScreen()->geometryChanged({});
-            return m_window->pos();
+            return QList<QPoint>{m_window->pos(), notice()->pos()};
         };
-        QCOMPARE(placeAfter({10, 10}), corner);
+        const QPoint inside(10, 10), outside(-50, 10);
+        QCOMPARE(placesAfter(inside, inside), (QList<QPoint>{corner, inside}));
         emit m_window->findChild<ToolkitTitlebar*>()->windowDragged();
-        QCOMPARE(placeAfter({10, 10}), QPoint(10, 10));
-        QCOMPARE(placeAfter({-50, 10}), corner);
-        // From then on the place is the client's again.
-        QCOMPARE(placeAfter({10, 10}), corner);
+        QCOMPARE(placesAfter(inside, outside), (QList<QPoint>{inside, centred(*notice())}));
+        QCOMPARE(placesAfter(outside, inside), (QList<QPoint>{corner, inside}));
+        // From then on the place is the client's again, as it is after a change of the box.
+        QCOMPARE(placesAfter(inside, inside), (QList<QPoint>{corner, inside}));
+        emit m_window->findChild<ToolkitTitlebar*>()->windowDragged();
+        for (const bool onTop : {true, false}) {
+            m_window->move(inside);
+            click("onTop");
+            const auto flags = Qt::Tool | Qt::FramelessWindowHint;
+            QCOMPARE(m_window->windowFlags(), onTop ? flags | Qt::WindowStaysOnTopHint : flags);
+            QCOMPARE(m_window->pos(), corner);
+        }
+        analyseScenes({"甲", "乙"});
+        QCOMPARE(m_window->geometry().bottomRight(), screen.bottomRight());
+    }
+
+    void clicksOnTheIcon()
+    {
+        using Tray = QSystemTrayIcon;
+        auto* icon = m_window->findChild<TrayIcon*>();
+        const QPoint corner = m_window->pos();
+        m_window->move(-50, 10);
+        const std::pair<Tray::ActivationReason, bool> clicks[] = {
+            {Tray::Trigger, false}, {Tray::Trigger, true},      {Tray::Context, true},
+            {Tray::Trigger, true},  {Tray::Unknown, true},      {Tray::DoubleClick, true},
+            {Tray::Trigger, false}, {Tray::MiddleClick, false}, {Tray::Trigger, true}};
+        for (const auto& [reason, shown] : clicks) {
+            emit icon->activated(reason);
+            QVERIFY2(m_window->isVisible() == shown, qPrintable(QString("click %1").arg(reason)));
+        }
+        QCOMPARE(m_window->pos(), corner);
+        QTRY_VERIFY(m_window->hasFocus());
+        m_window->close();
+        QVERIFY(m_window->isHidden());
+        emit m_window->findChild<ToolkitTitlebar*>()->windowDragged();
+        m_window->move(-50, 10);
+        emit icon->activated(Tray::Trigger);
+        QVERIFY(m_window->isVisible());
+        QCOMPARE(m_window->pos(), QPoint(-50, 10));
+
+        // Of a host that reports every click as one of its own.
+        QList<int> meant;
+        TrayClicks single;
+        for (const auto reason : {Tray::Trigger, Tray::Trigger, Tray::Trigger, Tray::MiddleClick, Tray::Trigger})
+            single.pass(Tray(), reason, [&](auto meaning) { meant.append(meaning); });
+        QCOMPARE(meant, QList<int>({3, 2, 3, 4, 3}));
     }
 
     void shutdownEndsTheWaitForATray()
@@ -170,28 +251,65 @@ private slots:
         for (const bool ended : {true, false}) {
             makeWindow(0);
             const SessionHost host(*m_window);
+            m_window->show();
             if (ended)
                 m_window->shutdown();
+            QCOMPARE(m_window->isHidden(), ended);
             const TrayHostWatch witness;
             QSignalSpy appeared(&witness, &TrayHostWatch::hostAppeared);
+            const LogCapture log;
             const TrayRegistry registry;
             QTRY_COMPARE(appeared.count(), 1);
+            QVERIFY(log.records().contains("info TrayHostWatch a tray host is there"));
             QCOMPARE(m_window->findChild<QSystemTrayIcon*>() != nullptr, !ended);
+            // Of a tray that shows no balloons, or of none.
+            emit host.findChild<Notification*>()->onMessage(1, "", "title", "text", "sender");
+            QTRY_VERIFY(log.records().contains(
+                "warning SessionHost neither a notification service nor a tray shows the message"));
         }
-        QVERIFY(m_window->findChild<QSystemTrayIcon*>()->isVisible());
+        const auto* icon = m_window->findChild<QSystemTrayIcon*>();
+        QCOMPARE(icon->toolTip(), QStringLiteral("终端域管平台"));
+        const auto isShown = [icon](const char* file) {
+            const QIcon drawn = zent::sizedIcon(QString(":/images/%1.svg").arg(file));
+            return !drawn.pixmap(64).isNull() && icon->icon().pixmap(64).toImage() == drawn.pixmap(64).toImage();
+        };
+        QVERIFY(isShown("finalogo"));
+        for (const int size : {16, 22, 24, 32, 48, 64})
+            QVERIFY2(icon->icon().availableSizes().contains({size, size}), qPrintable(QString::number(size)));
+        m_window->setSysThemetype(1);
+        QVERIFY(isShown("tarn"));
+        m_window->setSysThemetype(2);
+        QVERIFY(isShown("tarn_dark"));
+        QVERIFY(icon->isVisible());
         m_window->shutdown();
-        QVERIFY(!m_window->findChild<QSystemTrayIcon*>()->isVisible());
+        QVERIFY(!icon->isVisible());
     }
 
     void outputIsCutIntoPiecesOfWholeCharacters()
     {
-        const QString texts[] = {QString(300, 'x'), QString(100, QChar(0x4e2d))};
-        for (const QString& text : texts)
-            QCOMPARE(m_window->system("printf %s " + text), 0);
+        const QString x(300, 'x'), middle(100, QChar(0x4e2d));
+        const LogCapture log;
+        for (const QString& text : {x, middle, QString("'a\\344'")})
+            QCOMPARE(m_window->system("printf " + text), 0);
         QCOMPARE(m_window->system(""), -1);
-        const QStringList pieces = m_window->commandOutputLines();
-        QCOMPARE(pieces.size(), 6);
-        QCOMPARE(pieces.join(QString()), texts[0] + texts[1]);
+        const QStringList pieces{x.left(127),     x.left(127),     x.left(46), middle.left(42),
+                                 middle.left(42), middle.left(16), "a"};
+        QStringList lines;
+        for (const QString& piece : pieces)
+            lines.append("debug system \"" + piece + '"');
+        QCOMPARE(log.records(), lines);
+        QCOMPARE(m_window->commandOutputLines(), pieces.mid(0, 6) << QString("a") + QChar(QChar::ReplacementCharacter));
+        // A child that somebody else has waited for, and no descriptor for the pipe.
+        const auto handler = std::signal(SIGCHLD, SIG_IGN);
+        QCOMPARE(m_window->system("true"), -3);
+        std::signal(SIGCHLD, handler);
+        rlimit before{};
+        getrlimit(RLIMIT_NOFILE, &before);
+        const rlimit none{3, before.rlim_max};
+        setrlimit(RLIMIT_NOFILE, &none);
+        const int refused = m_window->system("true");
+        setrlimit(RLIMIT_NOFILE, &before);
+        QCOMPARE(refused, -2);
     }
 
     void aShellsInputIsEmptyAndNothingElseIsInherited()
@@ -205,12 +323,16 @@ private slots:
         m_window->closewindow();
         QTRY_COMPARE(processrecord::entries("killall").size(), 1);
         QCOMPARE(processrecord::words(processrecord::entries("killall")[0]), QStringList({"-9", "tarn"}));
+        emit m_window->findChild<InfoWidget*>()->shutdownClicked();
+        QTRY_COMPARE(processrecord::entries("oxa-shutdown").size(), 1);
     }
 
     void agreedInterface()
     {
-        for (void (MainWindow::*const member)() : {&MainWindow::getUserName, &MainWindow::getConfig})
-            (m_window.get()->*member)();
+        m_window->getConfig();
+        QVERIFY(m_window->whetherJoinGuard());
+        testfiles::write("/tmp/script", "脚本\n");
+        QCOMPARE(m_window->readScriptsFile("/tmp/script"), QStringLiteral("脚本\n"));
         const QMetaObject* type = m_window->metaObject();
         QStringList signalNames;
         for (int i = type->methodOffset(); i < type->methodCount(); ++i) {
@@ -219,17 +341,87 @@ private slots:
         }
         QCOMPARE(signalNames,
                  QStringList({"sizeChanged()", "newMessage()", "readNotify(QString)", "startgetMeInfo()"}));
+        QCOMPARE(m_window->generateRandnum(7, 7), 7);
+        QCOMPARE(m_window->generateRandnum(8, 7), 7);
+        // Within one second each call draws the same number.
+        nextSecond();
+        const int drawn = m_window->generateRandnum(INT_MAX, 0);
+        for (int width = 1; width <= 50; ++width)
+            QCOMPARE(m_window->generateRandnum(7 + width, 7), 7 + drawn % width);
     }
 
-    void administratorsMayRelease()
+    void placingGoesOnWhileThePanelIsShown()
+    {
+        QList<int> intervals;
+        for (const bool shown : {true, false}) {
+            m_window->setVisible(shown);
+            m_window->resetUIPos();
+            intervals.clear();
+            for (const QTimer* timer : m_window->findChildren<QTimer*>())
+                intervals += timer->isActive() ? timer->interval() : 0;
+            QCOMPARE(intervals.contains(1000), shown);
+        }
+        // The date's goes on.
+        QVERIFY(intervals.contains(1000000));
+    }
+
+    void linksOpenTheirDialogs()
     {
         const QString file = qEnvironmentVariable("ROOM") + "/standin/id.stdout";
-        for (const char* groups : {"1(sudo),2(my-zent)", "1(sudo)"}) {
+        for (const char* groups : {"1(sudo)", "1(sudo),2(my-zent)"}) {
             testfiles::write(file, groups);
-            const MainWindow window(nullptr, 1020);
-            QCOMPARE(window.findChild<QWidget*>("closeGuard") != nullptr, QString(groups).contains(','));
+            makeWindow(0);
+            QCOMPARE(m_window->findChild<QWidget*>("closeGuard") != nullptr, QString(groups).contains(','));
         }
         QFile::remove(file);
+        m_window->show();
+        const LogCapture log;
+        for (int opening = 0; opening < 2; ++opening) {
+            click("closeGuard");
+            click("changePassword");
+            QWidget* const dialogs[] = {m_window->findChild<closeGuarddialog*>(), m_window->findChild<ModifyDialog*>()};
+            for (QWidget* dialog : dialogs) {
+                QVERIFY(dialog->isVisible());
+                QCOMPARE(dialog->pos(), centred(*dialog));
+                dialog->move(0, 0);
+                dialog->hide();
+            }
+        }
+        QCOMPARE(log.records().count("debug closeguard get username : \"zhangsan\""), 2);
+        emit m_window->findChild<closeGuarddialog*>()->closeall();
+        QVERIFY(m_window->isHidden());
+    }
+
+    void noticeShowsTheNewestMessage_data() { fixture::addRows("noticedialog.json"); }
+    void noticeShowsTheNewestMessage()
+    {
+        QFETCH(QJsonObject, row);
+        makeWindow(row["unread"].toInt());
+        const LogCapture log;
+        // The dialog's wait gathers what comes meanwhile into one question.
+        for (int i = 0; i < 50; ++i)
+            QMetaObject::invokeMethod(m_window->findChild<TrayIcon*>(), &TrayIcon::balloonClicked,
+                                      Qt::QueuedConnection);
+        QTRY_VERIFY(notice()->isVisible());
+        QCOMPARE(log.count("showNotice"), 50);
+        fixture::compare(QJsonArray::fromStringList(log.records().filter("noticeDialog::")), row["log"]);
+        QVERIFY(notice()->windowFlags().testFlag(Qt::WindowStaysOnTopHint));
+        const auto views = notice()->findChildren<QPlainTextEdit*>();
+        QCOMPARE(notice()->focusWidget(), views.last());
+        fixture::compare(noticeContent(row["time"].toString()), row["shown"]);
+        const QLayout* layout = notice()->findChild<QWidget*>("informationWidget")->layout();
+        QCOMPARE(layout->indexOf(views[0]), 0);
+        QCOMPARE(layout->indexOf(views[1]), layout->count() - 2);
+        // A refresh leaves the focus where it is.
+        views[0]->setFocus();
+        m_platform.setUnread(5);
+        m_window->openNotice();
+        QTRY_COMPARE(next()->text(), QStringLiteral("下一条(5)"));
+        for (QWidget* inTabOrder : {static_cast<QWidget*>(views[0]), static_cast<QWidget*>(views[1]),
+                                    static_cast<QWidget*>(first()), static_cast<QWidget*>(next())}) {
+            QCOMPARE(notice()->focusWidget(), inTabOrder);
+            QTest::keyClick(inTabOrder, Qt::Key_Tab);
+        }
     }
 
     void oneMessageIsMarkedReadOnce()
@@ -237,8 +429,6 @@ private slots:
         makeWindow(1);
         m_window->openNotice();
         QTRY_VERIFY(notice()->isVisible());
-        QCOMPARE(first()->text(), QStringLiteral("已读"));
-        QVERIFY(notice()->windowFlags().testFlag(Qt::WindowStaysOnTopHint));
         QSignalSpy read(m_window.get(), &MainWindow::readNotify);
         BoxCloser boxes;
         m_platform.addFault({{"path", "*/read"}}, {{"status", 500}});
@@ -257,6 +447,16 @@ private slots:
         QTRY_VERIFY(!first()->signalsBlocked());
         first()->click();
         QVERIFY(notice()->isHidden());
+        // What is read elsewhere refreshes an open dialog only, also one behind another window.
+        for (const bool open : {false, true}) {
+            notice()->setVisible(open);
+            m_window->show();
+            m_window->activateWindow();
+            m_platform.clearRecord();
+            m_window->onReadAllMessage();
+            QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
+            QCOMPARE(m_platform.requests(kListPath).size(), open ? 1 : 0);
+        }
     }
 
     void firstButtonMarksOnlyWhatItSays_data() { fixture::addRows("noticebuttons.json"); }
@@ -271,6 +471,7 @@ private slots:
         m_window->openNotice();
         QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
         fixture::compare(first()->text(), row["text"]);
+        fixture::compare(next()->isVisible(), row["next"].toBool());
         first()->click();
         QCOMPARE(notice()->isHidden(), marked == 0);
         QTRY_COMPARE(m_platform.requests("/notification/v2/read").size(), marked);
@@ -279,20 +480,14 @@ private slots:
 
     void severalMessagesAreSteppedThrough()
     {
-        makeWindow(120);
-        m_window->openNotice();
-        QTRY_VERIFY(notice()->isVisible());
-        QCOMPARE(first()->text() + next()->text(), QStringLiteral("关闭下一条(...)"));
-        m_platform.setUnread(3);
+        makeWindow(3);
         m_window->openNotice();
         QTRY_COMPARE(next()->text(), QStringLiteral("下一条(3)"));
-        QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 2 %2"));
         QSignalSpy read(m_window.get(), &MainWindow::readNotify);
         next()->click();
         QVERIFY(!next()->isEnabled());
         QTRY_COMPARE(next()->text(), QStringLiteral("下一条(2)"));
         QCOMPARE(read, QList<QVariantList>{{"2"}});
-        read.clear();
         QVERIFY(next()->isEnabled());
         QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 1 %2"));
 
@@ -309,34 +504,12 @@ private slots:
         next()->click();
         QTRY_COMPARE(boxes.texts.size(), 1);
         QVERIFY2(boxes.texts.constFirst().startsWith("消息调用警告Error"), qPrintable(boxes.texts.constFirst()));
-        QVERIFY(logged);
         QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
-        QVERIFY(read.isEmpty() && !next()->isEnabled());
+        QVERIFY(logged && read.size() == 1 && !next()->isEnabled());
         QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 1 %2"));
         m_platform.clearFaults();
         m_window->onReadListMessage("other");
         QTRY_VERIFY(next()->isEnabled());
-    }
-
-    void floodOfActivationsAsksOnce()
-    {
-        makeWindow(1);
-        QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
-        m_platform.clearRecord();
-        LogCapture log;
-        for (int i = 0; i < 300; ++i)
-            QMetaObject::invokeMethod(m_window.get(), &MainWindow::openNotice, Qt::QueuedConnection);
-        QTRY_VERIFY(notice()->isVisible());
-        QCOMPARE(log.count("showNotice"), 300);
-        const QString step = "debug noticeDialog::getNotifyMessageList()-0%1:%2";
-        QCOMPARE(log.records().filter("noticeDialog::"),
-                 QStringList({step.arg(1).arg(" true"), step.arg(2).arg(" 1"), step.arg(3).arg("")}));
-        const QLayout* layout = notice()->findChild<QWidget*>("informationWidget")->layout();
-        const auto views = notice()->findChildren<QPlainTextEdit*>();
-        QCOMPARE(layout->indexOf(views[0]), 0);
-        QCOMPARE(layout->indexOf(views[1]), layout->count() - 2);
-        // One beside it is the poll's.
-        QVERIFY(m_platform.requests(kListPath).size() <= 2);
     }
 
     void windowMayGoAtAnyTime()
@@ -350,6 +523,92 @@ private slots:
         m_window->unreadMessages();
         m_window.reset();
         QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
+    }
+
+    void networkPage_data() { fixture::addRows("networkpages.json"); }
+    void networkPage()
+    {
+        QFETCH(QJsonObject, row);
+        QJsonArray values{"zhangsan",   "5C:3A:45:1E:7B:90", "10.20.30.117", "10.20.30.1",
+                          "10.20.1.53", "255.255.255.0",     "1000 Mb/s"};
+        values.prepend(zent::localHostName());
+        fixture::compare(page("hostValue"), values);
+        for (int i = 0; i < row["page"].toArray().size(); ++i)
+            values[i + 1] = row["page"].toArray()[i];
+        m_platform.addFault(kNetworkDaemon, row["fault"].toObject());
+        const LogCapture log;
+        m_window->onNetinfoClicked();
+        fixture::compare(page("hostValue"), values);
+        fixture::compare(FileConfig::GetInstance()->getMacAddress(), row["mac"]);
+        startNetworkDaemon();
+        fixture::compareLog(log, row["log"]);
+    }
+
+    void pagesThatTheDaemonMissedAreFilledOnOpening()
+    {
+        m_platform.addFault(kNetworkDaemon, {{"error", "com.vantor.Error.Failed"}});
+        makeWindow(0);
+        HttpRequest::GetInstance()->onUserInfo(200, R"({"code": 0, "data": {"user": {"gecos": "A,,,1"}}})");
+        const auto shown = [this] { return QJsonArray{page("terminalValue").at(2), page("hostValue").at(3)}; };
+        fixture::compare(shown(), QJsonArray{"", ""});
+        m_platform.clearFaults();
+        m_platform.clearRecord();
+        m_window->show();
+        fixture::compare(shown(), QJsonArray{"A", "10.20.30.117"});
+        m_window->hide();
+        m_window->show();
+        QCOMPARE(m_platform.record("dbus").size(), 1);
+    }
+
+    void scenesAreAskedOnceAfterTheOrganisation()
+    {
+        testfiles::write(testfiles::kMachineFile, "M 1&2\n");
+        testfiles::write(testfiles::kInfoFile,
+                         R"({"server_host": "server.zent.test", "server_port": "80", "protocol": "https"})");
+        makeWindow(0);
+        auto host = std::make_unique<SessionHost>(*m_window);
+        m_platform.clearRecord();
+        for (int code : {1, 0, 0})
+            HttpRequest::GetInstance()->onCompanyName(200, QString(R"({"code": %1, "data": {}})").arg(code));
+        QTRY_COMPARE(sceneBox()->count(), 3);
+        QJsonArray sent;
+        for (const QJsonObject& request : m_platform.requests("/api/client/area/scenes")) {
+            const QJsonObject headers = request["headers"].toObject();
+            sent += QJsonArray{request["method"], request["scheme"],       request["raw_query"],
+                               headers["host"],   headers["content-type"], headers["x-lumo-version"]};
+        }
+        fixture::compare(sent, QJsonArray{QJsonArray{"GET", "http", "machine_id=M%201%262%0A&username=zhangsan",
+                                                     "server.zent.test:80", "application/json", "v2"}});
+        // It leaves nothing on the bus.
+        host.reset();
+        const QDBusConnection bus = QDBusConnection::sessionBus();
+        QVERIFY(!bus.interface()->isServiceRegistered(zent::dbus::kClientService));
+        for (const QString& path : {zent::dbus::kNotificationPath, zent::dbus::kFullzonePath})
+            QVERIFY2(!bus.objectRegisteredAt(path), qPrintable(path));
+    }
+
+    /// Comes last: the pause is the process's.
+    void hangingNetworkDaemonCostsOneTimeOut()
+    {
+        m_window.reset();
+        NetworkDaemonProxy daemon(zent::dbus::kNetworkService, zent::dbus::kNetworkPath, QDBusConnection::sessionBus());
+        daemon.setTimeout(1500);
+        const QPair<QJsonObject, int> faults[] = {{{{"error", "com.vantor.Error.Failed"}, {"delay_ms", 1100}}, 3},
+                                                  {{{"vanish", true}}, 3},
+                                                  {{{"hang", true}}, 1}};
+        for (const auto& [action, asked] : faults) {
+            m_platform.addFault(kNetworkDaemon, action);
+            m_platform.clearRecord();
+            const LogCapture log;
+            for (int call = 0; call < 2; ++call) {
+                QVERIFY(!daemon.activeConnectionInfo());
+                startNetworkDaemon();
+            }
+            QCOMPARE(FileConfig::GetInstance()->getMacAddress(), QString());
+            QCOMPARE(m_platform.record("dbus").size(), asked);
+            QCOMPARE(log.count(". The network daemon is not asked again for 60 s."), asked == 1 ? 1 : 0);
+            startNetworkDaemon();
+        }
     }
 };
 

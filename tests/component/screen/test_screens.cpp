@@ -4,6 +4,7 @@
 #include "showwindow.h"
 #include "xwindows.h"
 
+#include <QScreen>
 #include <QWidget>
 
 /// Where windows go on a display of two monitors: 1024 x 768, and to its right the primary one of 1280 x 800.
@@ -14,6 +15,23 @@ class TestScreens : public QObject
     static QJsonValue sides(const QRect& area) { return QJsonArray{area.x(), area.y(), area.width(), area.height()}; }
 
 private slots:
+    /// Comes first: panels change what is available.
+    void changesAreSeen()
+    {
+        int seen = 0;
+        zent::screens::watch(this, [&seen] { ++seen; });
+        QScreen* screen = QGuiApplication::primaryScreen();
+        emit screen->geometryChanged({});
+        emit screen->availableGeometryChanged({});
+        emit qGuiApp->primaryScreenChanged(screen);
+        QCOMPARE(seen, 3);
+        emit qGuiApp->screenRemoved(screen);
+        QTRY_COMPARE(seen, 4);
+        emit qGuiApp->screenAdded(screen);
+        emit screen->geometryChanged({});
+        QCOMPARE(seen, 6);
+    }
+
     void workArea_data() { fixture::addRows("workareas.json"); }
     void workArea()
     {
@@ -63,13 +81,8 @@ private slots:
 
     void whatIsShownIsOnTop()
     {
-        QWidget first;
-        QWidget second;
+        QWidget first, second;
         QWidget tool(nullptr, Qt::Tool);
-        const auto isOnTop = [](const QWidget& window) {
-            const auto order = xwindows::property(QX11Info::appRootWindow(), "_NET_CLIENT_LIST_STACKING");
-            return window.isActiveWindow() && order.last() == window.winId();
-        };
         const auto isInTaskBar = [](const QWidget& window) {
             const auto states = xwindows::property(window.winId(), "_NET_WM_STATE");
             return !states.contains(xwindows::atom("_NET_WM_STATE_SKIP_TASKBAR")) &&
@@ -77,7 +90,9 @@ private slots:
         };
         for (QWidget* window : {&first, &second, &first, &tool, &second}) {
             zent::showActive(*window);
-            QTRY_VERIFY(isOnTop(*window));
+            QTRY_VERIFY(window->isActiveWindow());
+            QTRY_COMPARE(xwindows::property(QX11Info::appRootWindow(), "_NET_CLIENT_LIST_STACKING").last(),
+                         quint32(window->winId()));
             QCOMPARE(isInTaskBar(*window), window != &tool);
         }
     }

@@ -52,9 +52,16 @@ class TestDesktopNotifier : public QObject
         settle();
     }
 
-private slots:
-    void initTestCase() { QVERIFY2(qEnvironmentVariableIsSet("ROOM"), "runs inside a room only"); }
+    /// How long the notifier waits for the answers that it has asked for.
+    QList<int> patience() const
+    {
+        QList<int> intervals;
+        for (const QTimer* timer : m_notifier->findChildren<QTimer*>())
+            intervals.append(timer->interval());
+        return intervals;
+    }
 
+private slots:
     void init()
     {
         m_notifier = std::make_unique<DesktopNotifier>();
@@ -93,11 +100,10 @@ private slots:
         startServer();
         showOne();
         const uint ours = m_server->lastId;
+        QDBusConnection stranger = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "stranger");
         QDBusMessage forged =
             QDBusMessage::createSignal(NotificationServer::path(), NotificationServer::service(), "ActionInvoked");
-        forged << ours << "default";
-        QDBusConnection stranger = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "stranger");
-        QVERIFY(stranger.send(forged));
+        QVERIFY(stranger.send(forged << ours << "default"));
         emit m_server->ActionInvoked(ours + 1, "default");
         emit m_server->ActionInvoked(ours, "other");
         settle();
@@ -107,20 +113,14 @@ private slots:
         QTRY_COMPARE(m_activated->size(), 1);
         emit m_server->NotificationClosed(ours, 2);
         emit m_server->ActionInvoked(ours, "default");
+        // Another server's numbers are not ours.
+        showOne();
+        const uint last = m_server->lastId;
+        startServer();
+        settle();
+        emit m_server->ActionInvoked(last, "default");
         settle();
         QCOMPARE(m_activated->size(), 1);
-    }
-
-    void anotherServersNumbersAreNotOurs()
-    {
-        startServer();
-        showOne();
-        const uint ours = m_server->lastId;
-        startServer();
-        settle();
-        emit m_server->ActionInvoked(ours, "default");
-        settle();
-        QCOMPARE(m_activated->size(), 0);
     }
 
     void failureIsReported_data() { fixture::addRows("notifierfailures.json"); }
@@ -136,6 +136,8 @@ private slots:
         m_notifier->notify("<t>", kSender, "<x>");
         // It must not wait for the service.
         QCOMPARE(m_unavailable->size(), 0);
+        if (row["late"].toBool())
+            QTRY_COMPARE(patience(), QList<int>{5000});
         QVERIFY(m_unavailable->wait(10000));
         QCOMPARE(m_unavailable->first(), QVariantList({"<t>", kSender, "<x>"}));
         fixture::compareLog(log, row["log"]);

@@ -10,7 +10,6 @@
 #include <QDebug>
 #include <QNetworkAccessManager>
 #include <QNetworkReply>
-#include <QTimer>
 
 namespace
 {
@@ -23,8 +22,7 @@ constexpr int kRefreshLatestMs = 900000;
 } // namespace
 
 Account::Account(QObject* parent, zent::RandomInterval random)
-    : QObject(parent), m_random(std::move(random)), startedId(std::make_unique<IdCommand>()),
-      userInfoTimer(std::make_unique<QTimer>()), areaInfoTimer(std::make_unique<QTimer>())
+    : QObject(parent), m_random(std::move(random)), startedId(std::make_unique<IdCommand>())
 {
 }
 
@@ -51,10 +49,10 @@ void Account::start()
     const HttpRequest* client = HttpRequest::GetInstance();
     connect(client, &HttpRequest::sigUserInfo, this, &Account::onUserInfo);
     connect(client, &HttpRequest::sigCompanyName, this, &Account::onCompanyName);
-    connect(userInfoTimer.get(), &QTimer::timeout, this, &Account::getusrInfo);
-    userInfoTimer->start(kUserInfoIntervalMs);
-    connect(areaInfoTimer.get(), &QTimer::timeout, this, &Account::getAreaInfo);
-    areaInfoTimer->start(kAreaInfoIntervalMs);
+    connect(&userInfoTimer, &QTimer::timeout, this, &Account::getusrInfo);
+    userInfoTimer.start(kUserInfoIntervalMs);
+    connect(&areaInfoTimer, &QTimer::timeout, this, &Account::getAreaInfo);
+    areaInfoTimer.start(kAreaInfoIntervalMs);
 }
 
 TLoginInfo Account::loginInfo() const
@@ -94,7 +92,7 @@ void Account::onUserInfo(const int& statusCode, const QString& data)
         return;
     }
     storeUserData(reply.value);
-    userInfoTimer->stop();
+    userInfoTimer.stop();
     emit userChanged();
 }
 
@@ -119,7 +117,7 @@ void Account::analysejson(QNetworkReply* reply)
         qDebug() << "analysejson parse config.json file failed.";
         return;
     }
-    userInfoTimer->start(m_random(kRefreshLatestMs, kRefreshEarliestMs));
+    userInfoTimer.start(m_random(kRefreshLatestMs, kRefreshEarliestMs));
     qDebug() << "parse config.json file ok.";
 }
 
@@ -151,7 +149,7 @@ void Account::onCompanyName(const int& statusCode, const QString& data)
         qInfo() << "getCompanyName failed!" << statusCode;
         return;
     }
-    areaInfoTimer->stop();
+    areaInfoTimer.stop();
     organizationName = reply.value;
     emit organisationChanged();
 }
@@ -170,7 +168,7 @@ void Account::rcvAreainfoData(QNetworkReply* reply)
         qDebug() << "rcvAreainfoData parse config.json file failed.";
         return;
     }
-    areaInfoTimer->start(m_random(kRefreshLatestMs, kRefreshEarliestMs));
+    areaInfoTimer.start(m_random(kRefreshLatestMs, kRefreshEarliestMs));
     qDebug() << "parse config.json file ok.";
 }
 

@@ -6,13 +6,13 @@
 
 #include <QObject>
 #include <QString>
+#include <QTimer>
 
 #include <memory>
 
 class IdCommand;
 class QNetworkAccessManager;
 class QNetworkReply;
-class QTimer;
 
 namespace zent
 {
@@ -86,6 +86,6 @@ private:
     std::unique_ptr<IdCommand> startedId;
     QNetworkAccessManager* userManager = nullptr;
     QNetworkAccessManager* areaManager = nullptr;
-    std::unique_ptr<QTimer> userInfoTimer;
-    std::unique_ptr<QTimer> areaInfoTimer;
+    QTimer userInfoTimer{this};
+    QTimer areaInfoTimer{this};
 };

@@ -24,11 +24,11 @@
 #include <QFile>
 #include <QSignalBlocker>
 #include <QTextCodec>
-#include <QTimer>
 #include <QVBoxLayout>
 
 #include <cstdio>
 #include <cstdlib>
+#include <memory>
 
 /// The images live in a static library, whose initialiser the linker would otherwise drop. Outside any namespace, as
 /// the initialiser is.
@@ -77,9 +77,8 @@ MainWindow::MainWindow(QWidget* parent, int osVersion)
     onNetinfoClicked();
     onLogininfoClicked();
     scenes.renewCurrentScene(zent::kStartScene);
-    posTimer = std::make_unique<QTimer>();
-    connect(posTimer.get(), &QTimer::timeout, this, &MainWindow::resetUIPos);
-    posTimer->start(kPlacementIntervalMs);
+    connect(&posTimer, &QTimer::timeout, this, &MainWindow::resetUIPos);
+    posTimer.start(kPlacementIntervalMs);
     zent::screens::watch(this, [this] { returnToScreen(); });
     if (!WindowManagerHelper::instance()->hasBlurWindow())
         setMaskAlpha(kOpaque);
@@ -312,12 +311,12 @@ void MainWindow::resetUIPos()
     qDebug() << "resetUIPos :---------" << available.height() << ":" << full.height();
     if (full.height() > available.height()) {
         qDebug() << "resetUIPos :---@@@@";
-        posTimer->stop();
+        posTimer.stop();
         movedByUser = false;
         zent::screens::placeBottomRight(*this, available);
     }
     if (!isVisible())
-        posTimer->stop();
+        posTimer.stop();
 }
 
 int MainWindow::system(const QString& command)

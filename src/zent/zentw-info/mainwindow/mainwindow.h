@@ -10,9 +10,9 @@
 
 #include <QList>
 #include <QString>
+#include <QTimer>
 
 #include <array>
-#include <memory>
 
 class InfoWidget;
 class ModifyDialog;
@@ -118,7 +118,7 @@ private:
     NoticeDialog* noticeDialog = nullptr;
     QWidget* messageWindow = nullptr;
     closeGuarddialog* guardDialog = nullptr;
-    std::unique_ptr<QTimer> posTimer;
+    QTimer posTimer{this};
     NetworkDaemonProxy* networkProxy;
     Page infoPage = kLoginPage;
     /// By page: it was to be filled, and the network daemon has given no good answer since.

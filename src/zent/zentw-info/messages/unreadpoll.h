@@ -44,5 +44,5 @@ private:
     const QString& m_userName;
     int& m_count;
     const zent::RandomInterval m_random;
-    QTimer unreadTimer;
+    QTimer unreadTimer{this};
 };

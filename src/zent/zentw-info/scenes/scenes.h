@@ -78,6 +78,6 @@ private:
     int sceneState = 2;
     int currentSceneIndex = 0;
     bool sceneBoxReady = false;
-    QTimer policyTimer;
+    QTimer policyTimer{this};
     QTimer scenesAgain{this};
 };
