@@ -73,29 +73,14 @@ class TestTerminalFiles : public QObject
     }
 
 private slots:
+    void initTestCase() { std::signal(SIGXFSZ, SIG_IGN); }
     void init()
     {
         testfiles::remove(testfiles::kInfoFile);
         testfiles::remove(testfiles::kMachineFile);
         testfiles::remove(QFileInfo(testfiles::kStagedInfoFile).path());
-        testfiles::write(testfiles::kHostNameFile, "host-1\n");
-    }
-
-    void fullDiskLeavesTheFile()
-    {
-        testfiles::write(testfiles::kInfoFile, kWhole);
-        std::signal(SIGXFSZ, SIG_IGN);
-        rlimit before{};
-        getrlimit(RLIMIT_FSIZE, &before);
-        const rlimit full{20, before.rlim_max};
-        setrlimit(RLIMIT_FSIZE, &full);
-        const LogCapture log;
-        const bool saved = m_store->saveDomain(false) || m_store->saveUserInfo(UserInfo());
-        setrlimit(RLIMIT_FSIZE, &before);
-        QVERIFY(!saved);
-        fixture::compareLog(
-            log, QJsonArray{"warning write value failed, key: \"is_Domain\"", "warning write info json failed"});
-        QCOMPARE(testfiles::read(testfiles::kInfoFile), kWhole);
+        testfiles::remove(testfiles::kHostNameFile);
+        testfiles::write(testfiles::kHostNameFile, "host\n-9 \n");
     }
 
     void filesAreReplacedWhole()
@@ -174,6 +159,10 @@ private slots:
         // In a directory that nothing can be added to, the file is written in its place.
         QFile::setPermissions(directory, QFile::Permissions(row["sealed"].toBool() ? 0x5000 : 0x7000));
         QFile::setPermissions(testfiles::kInfoFile, QFile::Permissions(row["locked"].toBool() ? 0x4000 : 0x6000));
+        rlimit before{};
+        getrlimit(RLIMIT_FSIZE, &before);
+        const rlimit full{row["full"].toBool() ? 20 : before.rlim_cur, before.rlim_max};
+        setrlimit(RLIMIT_FSIZE, &full);
         const LogCapture log;
         const QString call = row["call"].toString();
         bool done = false;
@@ -185,6 +174,7 @@ private slots:
             m_store->getUserInfo(&done);
         else if (call == "saveUserInfo")
             done = m_store->saveUserInfo({true, "s", "1", "d", "2", "新"});
+        setrlimit(RLIMIT_FSIZE, &before);
         QFile::setPermissions(directory, QFile::Permissions(0x7000));
         QCOMPARE(done, row["done"].toBool());
         const QByteArray stored = testfiles::read(testfiles::kInfoFile);
@@ -199,42 +189,22 @@ private slots:
     void addresses()
     {
         QFETCH(QJsonObject, row);
-        const LogCapture log;
-        testfiles::write(testfiles::kInfoFile, QJsonDocument(row["file"].toObject()).toJson());
+        testfiles::write(testfiles::kInfoFile, row["before"].toString("{}").toUtf8());
         m_config->readServerConfig(testfiles::kInfoFile);
-        if (row.contains("then")) {
-            testfiles::write(testfiles::kInfoFile, row["then"].toString().toUtf8());
-            m_config->readServerConfig(testfiles::kInfoFile);
-        }
+        testfiles::remove(testfiles::kInfoFile);
+        writeFiles(row);
+        for (const QJsonValue& path : row["unreadable"].toArray())
+            QFile::setPermissions(path.toString(), {});
+        for (const QJsonValue& path : row["missing"].toArray())
+            testfiles::remove(path.toString());
+        const LogCapture log;
+        m_config->readServerConfig(testfiles::kInfoFile);
         QCOMPARE(m_config->getServerUrl("/a b?").toString(QUrl::FullyEncoded), row["server"].toString());
         QCOMPARE(m_config->getDomainUrl("/x").toString(QUrl::FullyEncoded), row["domain"].toString());
         const QJsonArray fields{m_config->readServerHost(), m_config->readServerPort(),   m_config->readDomainHost(),
                                 m_config->readDomainPort(), m_config->readTerminalName(), m_config->readIsDomain()};
         fixture::compare(fields, row["fields"]);
         fixture::compareLog(log, row["log"]);
-    }
-
-    void terminalIsCalledAsTheHost()
-    {
-        const auto name = [this] {
-            m_config->setTerminalName("unknown");
-            m_config->readServerConfig(testfiles::kInfoFile);
-            return m_config->readTerminalName();
-        };
-        const LogCapture log;
-        testfiles::write(testfiles::kHostNameFile, "host\n-9 \n");
-        QCOMPARE(name(), QString("host-9 "));
-        testfiles::write(testfiles::kInfoFile, "{}");
-        QFile::setPermissions(testfiles::kInfoFile, {});
-        QCOMPARE(name(), QString("host-9 "));
-        QFile::setPermissions(testfiles::kHostNameFile, {});
-        QCOMPARE(name(), QString());
-        testfiles::remove(testfiles::kHostNameFile);
-        QCOMPARE(name(), QString());
-        const QString unreadable = "warning fail to open file userinfo.json !";
-        fixture::compareLog(log, QJsonArray{"warning  not found userinfo.json", unreadable, unreadable,
-                                            "warning  open filed : \"/etc/hostname\"", unreadable,
-                                            "warning  not found : \"/etc/hostname\""});
     }
 
     void stagingCopyCarriesTheChangeOnly()
@@ -245,7 +215,6 @@ private slots:
         const QString staging = QFileInfo(testfiles::kStagedInfoFile).path();
         QTemporaryDir elsewhere;
         const LogCapture log;
-        const QString written = "debug FileConfig::writeServerInfo---strConfig: \"{\\n*终端*\\n}\\n\"";
         QVERIFY(QFile::link(elsewhere.path(), staging));
         m_config->writeServerConfig();
         QVERIFY2(QDir(elsewhere.path()).isEmpty(), "followed a link that lay in wait");
@@ -268,7 +237,7 @@ private slots:
         QCOMPARE(modeOf(staging), 0755U);
         QJsonArray lines;
         for (int time = 0; time < 6; ++time) {
-            lines.append(written);
+            lines.append("debug FileConfig::writeServerInfo---strConfig: \"{\\n*终端*\\n}\\n\"");
             lines.append(time < 4 ? "warning file open error" : "info write json success");
         }
         fixture::compareLog(log, lines);
