@@ -6,6 +6,7 @@
 
 #include <QNetworkAccessManager>
 #include <QNetworkProxy>
+#include <QTcpSocket>
 
 namespace
 {
@@ -77,7 +78,8 @@ private slots:
             QCOMPARE(timers[0]->interval(), interval);
             QVERIFY(QMetaObject::invokeMethod(timers[0], "timeout"));
             QCOMPARE(running(guard), QList<int>({1500, std::min(2 * interval, 30000)}));
-            // The attempt has its time.
+            // An address is not looked up first; the attempt has its time.
+            QCOMPARE(guard.findChildren<QTcpSocket*>().size(), 1);
             QVERIFY(QMetaObject::invokeMethod(timers[1], "timeout"));
             QCOMPARE(running(guard), QList<int>({std::min(2 * interval, 30000)}));
             QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
