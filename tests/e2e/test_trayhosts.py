@@ -37,6 +37,10 @@ def gdbus(service, path, method, *arguments):
 
 class HostTest(ClientTest):
     tray = False
+    host = "start_notifier_tray"
+
+    def start_host(self):
+        return getattr(self.desktop, self.host)()
 
     def wait_icon(self, seconds=ICON_SECONDS):
         self.until("the icon", self.desktop.icon, seconds)
@@ -50,25 +54,8 @@ class HostTest(ClientTest):
                                "com.vantor.tarn.Notification.Notify", "1", "lisi", "a", "b", "c"), "()\n")
         roomclient.wait_syslog("message for another user not shown")
 
-    def wake_ups(self):
-        with open(f"/proc/{self.client.pid}/status", encoding="ascii") as stream:
-            return int(next(line for line in stream if line.startswith("voluntary")).split()[1])
 
-
-class XembedHost(HostTest):
-    def start_host(self):
-        return self.desktop.start_tray()
-
-
-class NotifierHost(HostTest):
-    def start_host(self):
-        return self.desktop.start_notifier_tray()
-
-    def has_item(self):
-        return f"StatusNotifierItem-{self.client.pid}-1" in self.desktop.registry("RegisteredStatusNotifierItems")
-
-
-class Soon:
+class Notifier(HostTest):
     def test_host_that_starts_beside_the_client_and_restarts(self):
         self.client = self.desktop.start_client(CLIENT)
         host = self.start_host()
@@ -82,7 +69,15 @@ class Soon:
         self.assertIsNone(self.client.poll())
 
 
-class Late:
+class Xembed(Notifier):
+    host = "start_tray"
+
+
+class LateNotifier(HostTest):
+    def wake_ups(self):
+        with open(f"/proc/{self.client.pid}/status", encoding="ascii") as stream:
+            return int(next(line for line in stream if line.startswith("voluntary")).split()[1])
+
     def test_host_after_a_minute(self):
         self.start()
         before = self.wake_ups()
@@ -92,23 +87,14 @@ class Late:
         self.wait_icon()
 
 
-class Xembed(Soon, XembedHost):
-    pass
+class LateXembed(LateNotifier):
+    host = "start_tray"
 
 
-class LateXembed(Late, XembedHost):
-    pass
+class Registry(HostTest):
+    def has_item(self):
+        return f"StatusNotifierItem-{self.client.pid}-1" in self.desktop.registry("RegisteredStatusNotifierItems")
 
-
-class LateNotifier(Late, NotifierHost):
-    pass
-
-
-class Notifier(Soon, NotifierHost):
-    pass
-
-
-class Registry(NotifierHost):
     def test_before_its_host(self):
         self.start()
         self.desktop.spawn(["/usr/bin/python3", "-B", REGISTRY])

@@ -40,7 +40,6 @@ void Terminal::read()
     serverHost = object.value(infokey::kServerHost).toString();
     // Read as text here while the notification client reads a number: each serves one form of the file.
     serverPort = object.value(infokey::kServerPort).toString();
-    isDomain = object.value(infokey::kIsDomain).toString();
     hostName = localHostName();
 }
 

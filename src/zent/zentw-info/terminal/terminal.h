@@ -14,7 +14,6 @@ namespace zent
 struct Terminal {
     QString serverHost;
     QString serverPort;
-    QString isDomain;
     QString machineId;
     QString hostName;
 
