@@ -13,20 +13,7 @@
 #include "toolkittoolbutton.h"
 #include "toolkitwarningbutton.h"
 
-#include <QAbstractButton>
-#include <QAbstractItemView>
-#include <QAccessible>
-#include <QAction>
-#include <QClipboard>
-#include <QHelpEvent>
-#include <QLabel>
-#include <QMenu>
-#include <QMouseEvent>
-#include <QPushButton>
-#include <QSignalSpy>
-#include <QTimer>
-#include <QToolButton>
-#include <QToolTip>
+#include <QtWidgets>
 
 namespace
 {
@@ -275,6 +262,9 @@ private slots:
         QCOMPARE(field.contains(bubble->geometry()), false);
         edit.move(field.x() + 3, field.y());
         QCOMPARE(bubble->x(), field.x() + 3);
+        bubble->move(0, 0);
+        QApplication::postEvent(&window, new QEvent(QEvent::LayoutRequest));
+        QTRY_COMPARE(bubble->x(), field.x() + 3);
         edit.hideAlertMessage();
         QVERIFY(!bubble->isVisible() && edit.alertMessage().isEmpty() && !timer->isActive());
     }
@@ -455,6 +445,11 @@ private slots:
         edit.showAlertMessage("wrong");
         QCOMPARE(alerts.count(), 1);
         QVERIFY(edit.isAlert());
+        auto* doomed = new ToolkitLineEdit(&frame);
+        doomed->showAlertMessage("wrong");
+        const QPointer<QLabel> bubble = frame.findChildren<QLabel*>("alertBubble").last();
+        delete doomed;
+        QVERIFY(!bubble);
         // A window that only the desktop hides keeps the bubble.
         for (const bool spontaneous : {true, false}) {
             QHideEvent hidden;
