@@ -285,6 +285,9 @@ private slots:
         }
         // It does so once.
         label.hide();
+        label.shrinkFontToWidth();
+        label.show();
+        label.hide();
         label.setFont(font(14));
         label.show();
         QCOMPARE(label.font().pixelSize(), 14);
