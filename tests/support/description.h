@@ -11,14 +11,6 @@
 namespace description
 {
 
-/// A size that is fixed, or its bounds where it has any; the rest is the font's and the layout's.
-inline QString bounds(int least, int most)
-{
-    if (least == most)
-        return QString::number(least);
-    return (least > 0 ? QString::number(least) : "") + '-' + (most < QWIDGETSIZE_MAX ? QString::number(most) : "");
-}
-
 /// What a layout leaves around and between its items, and the items in order: a widget, a layout or a spacer, with
 /// stretch and alignment.
 inline QString items(const QLayout* layout)
@@ -67,16 +59,20 @@ inline QString looks(const QWidget* widget)
 
 inline QString text(const QVariant& value)
 {
+    if (value.type() == QVariant::Pixmap)
+        return text(value.value<QPixmap>().size());
     if (value.type() == QVariant::Icon)
         return value.value<QIcon>().isNull() ? "none" : "some";
     if (value.type() == QVariant::Cursor)
         return QString::number(value.value<QCursor>().shape());
+    if (value.type() == QVariant::Size)
+        return QString("%1x%2").arg(value.toSize().width()).arg(value.toSize().height());
     if (value.type() == QVariant::SizePolicy)
         return QString("%1,%2")
             .arg(value.value<QSizePolicy>().horizontalPolicy())
             .arg(value.value<QSizePolicy>().verticalPolicy());
     QString text;
-    QDebug(&text).nospace() << (value.type() == QVariant::Pixmap ? value.value<QPixmap>().size() : value);
+    QDebug(&text).nospace() << (value);
     return text.replace(QRegularExpression("^QVariant\\([^,]*, (.*)\\)$"), "\\1");
 }
 
@@ -88,9 +84,9 @@ inline QString properties(const QObject* object)
                                       new QDialog,     new QTimer,      new QAction};
     // What the font, the layout or the platform decides, and what is read elsewhere.
     static const QRegularExpression kSkipped(
-        "^(objectName|.*[gG]eometry|x|y|pos|(frameR|r)ect|(?!icon).*[sS]ize|.*Width|"
+        "^(objectName|.*[gG]eometry|x|y|pos|(frameR|r)ect|(?!icon|minimumS|maximumS).*[sS]ize|.*Width|"
         ".*Height|width|height|children.*|.*sizeHint|.*SizeHint|font|palette|locale|"
-        ".*isible|active|remainingTime|cursorPosition|displayText|windowIcon|"
+        ".*isible|isActiveWindow|remainingTime|cursorPosition|displayText|windowIcon|"
         "autoRepeat.*|iconText)$");
     const QObject* base = nullptr;
     for (const QObject* one : kNew)
@@ -126,14 +122,15 @@ inline QString line(const QObject* object, const QWidget* window)
     const auto* widget = qobject_cast<const QWidget*>(object);
     if (!widget)
         return name + properties(object);
-    QString line = QString(" %1x%2").arg(bounds(widget->minimumWidth(), widget->maximumWidth()),
-                                         bounds(widget->minimumHeight(), widget->maximumHeight()));
+    QString line;
     if (widget->isWindow())
         line += ' ' + QString::number(widget->windowFlags(), 16);
     else if (!widget->parentWidget()->layout())
         line += QString(" at %1,%2").arg(widget->x()).arg(widget->y());
     if (widget->layout())
         line += " layout " + items(widget->layout());
+    if (const auto* edit = qobject_cast<const QLineEdit*>(widget))
+        line += QString(" margins %1,%2").arg(edit->textMargins().left()).arg(edit->textMargins().right());
     if (const auto* frame = qobject_cast<const ToolkitBlurFrame*>(widget))
         line += QString(" mask %1 %2 %3").arg(frame->maskColor().name()).arg(frame->maskAlpha()).arg(frame->radius());
     return name + line + properties(widget) + states(widget, window) + looks(widget);

@@ -12,12 +12,10 @@ namespace
 constexpr int kFirstRadius = 12;
 
 /// Makes a frame that is a window a window to assistive programs too: they would take it for a container.
-QAccessibleInterface* windowInterface(const QString& className, QObject* object)
+QAccessibleInterface* windowInterface(const QString&, QObject* object)
 {
     auto* widget = qobject_cast<ToolkitBlurFrame*>(object);
-    if (!widget || !widget->isWindow() || className != QLatin1String(ToolkitBlurFrame::staticMetaObject.className()))
-        return nullptr;
-    return new QAccessibleWidget(widget, QAccessible::Window);
+    return widget && widget->isWindow() ? new QAccessibleWidget(widget, QAccessible::Window) : nullptr;
 }
 
 } // namespace

@@ -16,54 +16,38 @@
 namespace
 {
 
-/// Room that a control's frame or box takes from its text on both sides together.
-int surround(const QAbstractButton* button)
-{
-    return button->inherits("QCheckBox") ? 20 : 4;
-}
-
 /// What of the window's visible controls is cut off, as a text; empty where nothing is.
 QString cutOff(const QWidget& window)
 {
     QStringList faults;
-    const auto fault = [&](const QWidget* widget, const QString& text) {
-        faults += QStringLiteral("%1 \"%2\"").arg(QLatin1String(widget->metaObject()->className()), text);
-    };
-    const QList<QWidget*> widgets = window.findChildren<QWidget*>();
-    for (const QWidget* widget : widgets) {
-        if (widget->window() != &window || !widget->isVisible() ||
-            widget->objectName().startsWith(QLatin1String("qt_")))
+    for (const QWidget* widget : window.findChildren<QWidget*>()) {
+        if (widget->window() != &window || !widget->isVisible() || widget->objectName().startsWith("qt_"))
             continue;
-        const QRegion shown = widget->visibleRegion();
+        const QString text = widget->property("text").toString();
         const QFontMetrics metrics = widget->fontMetrics();
+        bool fits = true;
         if (const auto* label = qobject_cast<const ToolkitLabel*>(widget)) {
             const QRect area = label->contentsRect();
-            if (label->wordWrap()) {
-                if (label->heightForWidth(label->width()) > label->height())
-                    fault(label, label->text());
-                continue;
-            }
-            const QRect ink = metrics.tightBoundingRect(label->text()).translated(0, label->baseline());
-            const bool high = ink.top() < area.top() || ink.bottom() > area.bottom();
-            if (high || metrics.horizontalAdvance(label->text()) > area.width())
-                fault(label, label->text());
-        } else if (const auto* button = qobject_cast<const QAbstractButton*>(widget)) {
-            const QSize needed = metrics.size(Qt::TextShowMnemonic, button->text());
-            const int ink = metrics.tightBoundingRect(button->text()).height();
-            if (needed.width() + surround(button) > button->width() || ink > button->height())
-                fault(button, button->text());
+            const QRect ink = metrics.tightBoundingRect(text).translated(0, label->baseline());
+            fits = label->wordWrap() ? label->heightForWidth(label->width()) <= label->height()
+                                     : ink.top() >= area.top() && ink.bottom() <= area.bottom() &&
+                                           metrics.horizontalAdvance(text) <= area.width();
+        } else if (qobject_cast<const QAbstractButton*>(widget)) {
+            // What its frame or box takes from the text on both sides together.
+            const int around = widget->inherits("QCheckBox") ? 20 : 4;
+            fits = metrics.size(Qt::TextShowMnemonic, text).width() + around <= widget->width() &&
+                   metrics.tightBoundingRect(text).height() <= widget->height();
         } else if (const auto* edit = qobject_cast<const QLineEdit*>(widget)) {
-            const QMargins margins = edit->textMargins();
-            if (metrics.horizontalAdvance(edit->placeholderText()) > edit->width() - margins.left() - margins.right())
-                fault(edit, edit->placeholderText());
+            const int room = edit->width() - edit->textMargins().left() - edit->textMargins().right();
+            fits = metrics.horizontalAdvance(edit->placeholderText()) <= room;
         } else {
             continue;
         }
         // Nothing of a control lies outside its parents; labels may be empty.
-        if (shown.boundingRect() != widget->rect())
-            fault(widget, QStringLiteral("partly hidden"));
+        if (!fits || widget->visibleRegion().boundingRect() != widget->rect())
+            faults += QString("%1 \"%2\"%3").arg(widget->metaObject()->className(), text, fits ? " partly hidden" : "");
     }
-    return faults.join(QStringLiteral(", "));
+    return faults.join(", ");
 }
 
 } // namespace
@@ -80,7 +64,7 @@ private slots:
         MainWindow window(nullptr, 1020);
         window.show();
         QVERIFY(QTest::qWaitForWindowExposed(&window));
-        QTRY_VERIFY(!window.findChild<QLabel*>(QStringLiteral("macValue"))->text().isEmpty());
+        QTRY_VERIFY(!window.findChild<QLabel*>("macValue")->text().isEmpty());
         QByteArray scenes = "{'code': 0, 'message': [{'scene_name': 'a', 'scene_code': 'a'},"
                             "{'scene_name': 'b', 'scene_code': 'b'}]}";
         scenes.replace('\'', '"');
@@ -96,18 +80,18 @@ private slots:
     {
         closeGuarddialog release(nullptr);
         ModifyDialog password(nullptr);
-        NoticeDialog notice(QStringLiteral("zhangsan"), nullptr);
+        NoticeDialog notice("zhangsan", nullptr);
         resumeDialog integrity(nullptr);
         spinerWin waiting(nullptr);
         spinerWin finished(nullptr);
         finished.closing();
         ToolkitDialog box;
-        notice.setTitle(QStringLiteral("消息详情"));
-        notice.nextButton()->setText(QStringLiteral("下一条(...)"));
-        integrity.setRepairTitle(QStringLiteral("关键文件被修改：/usr/bin/login"));
-        box.setTitle(QStringLiteral("消息调用警告"));
-        box.setMessage(QStringLiteral("网络异常，请稍后重试。").repeated(12));
-        box.addButton(QStringLiteral("确定"), true, ToolkitDialog::ButtonRecommend);
+        notice.setTitle("消息详情");
+        notice.nextButton()->setText("下一条(...)");
+        integrity.setRepairTitle("关键文件被修改：/usr/bin/login");
+        box.setTitle("消息调用警告");
+        box.setMessage(QString("网络异常，请稍后重试。").repeated(12));
+        box.addButton("确定", true, ToolkitDialog::ButtonRecommend);
         QWidget* windows[] = {&release, &password, &notice, &integrity, &waiting, &finished, &box};
         for (QWidget* window : windows) {
             window->show();
