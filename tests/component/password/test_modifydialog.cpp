@@ -5,6 +5,7 @@
 #include "platformcontrol.h"
 #include "toolkitpasswordedit.h"
 
+#include <QPointer>
 #include <QPushButton>
 
 namespace
@@ -182,6 +183,23 @@ private slots:
         QTRY_COMPARE(m_platform.record("process").size(), good ? 1 : 0);
         QCOMPARE(m_platform.record("process").value(0).value("token_ok").toBool(), good);
         fixture::compareLog(log, row["log"]);
+    }
+
+    void repliesOfTheServerAreLogged()
+    {
+        QNetworkAccessManager manager;
+        // Neither has a code.
+        for (const char* path : {"state", "none"}) {
+            const LogCapture log;
+            QPointer<QNetworkReply> reply =
+                manager.get(QNetworkRequest(QUrl(QString("http://127.0.0.1:9900/") + path)));
+            QTRY_VERIFY(reply->isFinished());
+            m_dialog->onPasswordChecked(reply);
+            QTRY_VERIFY(!reply);
+            const bool good = qstrcmp(path, "state") == 0;
+            QCOMPARE(log.records(), good ? QStringList("debug parse config.json file failed.") : QStringList());
+        }
+        QCOMPARE(m_boxes.texts, QStringList({"修改密码失败", "修改密码失败"}));
     }
 
     void tokenWithoutAGoodFile_data() { fixture::addRows("tokenfailures.json"); }
