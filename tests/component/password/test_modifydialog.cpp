@@ -5,6 +5,7 @@
 #include "platformcontrol.h"
 #include "toolkitpasswordedit.h"
 
+#include <QPointer>
 #include <QPushButton>
 
 namespace
@@ -85,6 +86,18 @@ private slots:
         m_platform.patchState({{"users", QJsonObject{{"zhangsan", QJsonObject{{"password", kOld}}}}}});
     }
 
+    void confirmNeedsTwoPasswordsAndARepetition()
+    {
+        fill("a", "b", "b");
+        QVERIFY(confirm()->isEnabled());
+        for (const QStringList& texts : {QStringList{"", "b", "b"}, {"a", "", ""}, {"a", "b", "c"}}) {
+            fill(texts[0], texts[1], texts[2]);
+            QVERIFY2(!confirm()->isEnabled(), qPrintable(texts.join(' ')));
+        }
+        fresh()->setText("c");
+        QVERIFY(confirm()->isEnabled());
+    }
+
     void serviceAnswers_data() { fixture::addRows("passwordanswers.json"); }
     void serviceAnswers()
     {
@@ -110,11 +123,13 @@ private slots:
                 QTest::keyClicks(field, field == repeat() ? "abd" : "abc");
             m_dialog->onRepasswordeditFinished();
             QVERIFY(repeat()->isAlert());
+            QCOMPARE(repeat()->alertMessage(), QStringLiteral("密码不一致"));
             if (byKey)
                 QTest::keyClick(m_dialog.get(), Qt::Key_Escape);
             else
                 m_dialog->close();
             QVERIFY(m_dialog->isHidden() && !repeat()->isAlert());
+            QCOMPARE(repeat()->alertMessage(), QString());
             // Not only before the next opening: nothing typed stays in the memory of a closed dialog.
             QCOMPARE(old()->text() + fresh()->text() + repeat()->text(), QString());
             m_dialog->show();
@@ -170,31 +185,46 @@ private slots:
         fixture::compareLog(log, row["log"]);
     }
 
+    void repliesOfTheServerAreLogged()
+    {
+        QNetworkAccessManager manager;
+        // Neither has a code.
+        for (const char* path : {"state", "none"}) {
+            const LogCapture log;
+            QPointer<QNetworkReply> reply =
+                manager.get(QNetworkRequest(QUrl(QString("http://127.0.0.1:9900/") + path)));
+            QTRY_VERIFY(reply->isFinished());
+            m_dialog->onPasswordChecked(reply);
+            QTRY_VERIFY(!reply);
+            const bool good = qstrcmp(path, "state") == 0;
+            QCOMPARE(log.records(), good ? QStringList("debug parse config.json file failed.") : QStringList());
+        }
+        QCOMPARE(m_boxes.texts, QStringList({"修改密码失败", "修改密码失败"}));
+    }
+
+    void tokenWithoutAGoodFile_data() { fixture::addRows("tokenfailures.json"); }
     void tokenWithoutAGoodFile()
     {
-        for (const char* content : {"", "{\"token\": \"old\", ", "[\"token\"]"}) {
-            testfiles::remove(testfiles::kInfoFile);
-            if (*content)
-                testfiles::write(testfiles::kInfoFile, content);
-            m_boxes.texts.clear();
-            m_dialog->renewToken("T");
-            QCOMPARE(QFile::exists(testfiles::kInfoFile), *content != '\0');
-            QCOMPARE(testfiles::read(testfiles::kInfoFile), QByteArray(content));
-            QCOMPARE(m_boxes.texts.filter("域管终端提示").size(), 1);
-            QCOMPARE(m_log->lines().filter(QRegularExpression("parse file failed!$")).size(), *content ? 1 : 0);
-            m_log.reset();
-            m_log = std::make_unique<LogCapture>();
-        }
-        testfiles::write(testfiles::kInfoFile, m_info);
-        QFile::setPermissions(testfiles::kInfoFile, QFile::ReadOwner);
-        m_boxes.texts.clear();
-        m_dialog->renewToken("T");
+        QFETCH(QJsonObject, row);
+        const LogCapture log;
+        const bool exists = row.contains("content");
+        const QByteArray content = row["content"].toString().toUtf8();
         testfiles::remove(testfiles::kInfoFile);
-        QCOMPARE(m_boxes.texts.filter("读取/etc/zent/userinfo.json失败，错误原因是：Permission denied").size(), 1);
-        QVERIFY(m_log->contains("no config.json to use, error code:  5 , error detail:  \"Permission denied\""));
-        // The dialog may go while the first notice is open.
+        if (exists)
+            testfiles::write(testfiles::kInfoFile, content);
+        QFile::setPermissions(testfiles::kInfoFile,
+                              QFile::Permissions(row["mode"].toInt(QFile::ReadOwner | QFile::WriteOwner)));
+        m_dialog->renewToken("T");
+        QCOMPARE(QFile::exists(testfiles::kInfoFile), exists);
+        QCOMPARE(testfiles::read(testfiles::kInfoFile), content);
+        testfiles::remove(testfiles::kInfoFile);
+        QCOMPARE(m_boxes.texts, QStringList{row["box"].toString()});
+        fixture::compareLog(log, row["log"]);
+    }
+
+    void dialogMayGoWhileANoticeIsOpen()
+    {
         QByteArray body("{\"code\": 0, \"message\": \"T\"}");
-        m_boxes.texts.clear();
         m_boxes.instead = [this] { m_dialog.reset(); };
         QVERIFY(m_dialog->analyseData(&body));
         QVERIFY(!m_dialog);

@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "fixture.h"
 #include "gates.h"
 #include "idcommand.h"
 #include "log.h"
-#include "testfiles.h"
+#include "signalquit.h"
 
 #include <QCoreApplication>
 #include <QRegularExpression>
@@ -36,6 +37,9 @@ private slots:
         // "id" ends with 1 when a group has no name, which is common with directory groups.
         testfiles::write(m_room + "/standin/id.rc", "1");
         QVERIFY(passes("uid=1(a) groups=9(zent)\n"));
+        testfiles::write(m_room + "/standin/id.hook", "echo zent; kill -9 $PPID");
+        QVERIFY(!isLDAPUser());
+        testfiles::remove(m_room + "/standin/id.hook");
         // More than a pipe holds. Nothing stays open.
         const auto open = [] { return QDir("/proc/self/fd").count(); };
         const uint before = open();
@@ -78,12 +82,30 @@ private slots:
 
     void minorVersion()
     {
-        testfiles::write(testfiles::kVersionFile, "MinorVersion=1\nMinorVersion=1021\nX=1\n");
-        QCOMPARE(getMiniVersion(), 1021);
-        testfiles::write(testfiles::kVersionFile, "MajorVersion=20\n");
+        const LogCapture log;
+        const QPair<QByteArray, int> files[] = {{"MinorVersion=1\nMinorVersion=1021\nX=1\n", 1021}, {"X=20\n", -1}};
+        for (const auto& [content, version] : files) {
+            testfiles::write(testfiles::kVersionFile, content);
+            QCOMPARE(getMiniVersion(), version);
+        }
+        QFile::setPermissions(testfiles::kVersionFile, {});
         QCOMPARE(getMiniVersion(), -1);
         testfiles::remove(testfiles::kVersionFile);
         QCOMPARE(getMiniVersion(), 1000);
+        QCOMPARE(log.records(), QStringList({"debug nOSVersion: 1", "debug nOSVersion: 1021"}));
+    }
+
+    void signalsEndTheEventLoop()
+    {
+        for (const int number : {SIGTERM, SIGINT}) {
+            const LogCapture log;
+            const SignalQuit signalQuit;
+            QTimer::singleShot(10000, [] { QCoreApplication::exit(1); });
+            QTimer::singleShot(0, [number] { std::raise(number); });
+            QCOMPARE(QCoreApplication::exec(), 0);
+            QCOMPARE(log.records(), QStringList("info SignalQuit termination signal, quitting"));
+        }
+        QVERIFY(std::signal(SIGTERM, SIG_DFL) == SIG_DFL);
     }
 
     void identityLivesAsLongAsTheLog()
@@ -111,14 +133,17 @@ private slots:
     {
         zent::uOpenlog(zent::LEVEL_DEBUG);
         qDebug().noquote() << "first 记录 %s";
-        const int line = __LINE__ - 1;
+        qInfo("fifth");
+        const int line = __LINE__ - 2;
         zent::uSyslogMessageHandler(QtFatalMsg, QMessageLogContext("a/b/c.cpp", 7, "int f()", "default"), "second");
         zent::uOpenlog(zent::LEVEL_WARNING);
         qDebug("dropped");
+        qInfo("dropped");
         qWarning("third");
+        qCritical("fourth");
         zent::uCloselog();
         qInstallMessageHandler(nullptr);
-        QTRY_VERIFY(testfiles::read(m_room + "/syslog").contains("third"));
+        QTRY_VERIFY(testfiles::read(m_room + "/syslog").contains("fourth"));
 
         const QString here = "test_startup.cpp void TestStartup::syslogRecords() ";
         // The priority, which 24, the facility of daemons, is part of, and what follows the time stamp. The record ends
@@ -126,7 +151,9 @@ private slots:
         const QList<QPair<QString, QString>> expected = {
             {"31", QStringLiteral("debug [ %1%2]  first 记录 %s ").arg(here).arg(line)},
             {"27", "fata [ c.cpp int f() 7]  second "},
-            {"28", QStringLiteral("warning [ %1%2]  third ").arg(here).arg(line + 5)},
+            {"28", QStringLiteral("warning [ %1%2]  third ").arg(here).arg(line + 7)},
+            {"26", QStringLiteral("critical [ %1%2]  fourth ").arg(here).arg(line + 8)},
+            {"30", QStringLiteral("info [ %1%2]  fifth ").arg(here).arg(line + 1)},
         };
         const QStringList records = QString::fromUtf8(testfiles::read(m_room + "/syslog")).split('\n');
         for (const auto& [priority, text] : expected) {
