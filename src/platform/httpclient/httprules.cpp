@@ -128,8 +128,9 @@ void limitReply(QNetworkReply* reply)
         reply->abort();
     };
     noteLookup(reply);
-    // One byte more than is allowed tells the reply that is too large.
-    reply->setReadBufferSize(kMaxReplyBytes + 1);
+    // More than is allowed tells the reply that is too large. Over plain HTTP Qt stops up to 128 KiB short of this size.
+    constexpr qint64 kMargin = 256 * 1024;
+    reply->setReadBufferSize(kMaxReplyBytes + kMargin);
     QObject::connect(reply, &QNetworkReply::metaDataChanged, reply, check);
     QObject::connect(reply, &QNetworkReply::readyRead, reply, check);
 }
