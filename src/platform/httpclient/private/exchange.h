@@ -18,7 +18,7 @@ struct Result {
     QNetworkReply::NetworkError error = QNetworkReply::NoError;
     /// In words for the log, when `error` is one.
     QString reason = {};
-    int status = {};
+    int status = 0;
     QByteArray body = {};
 };
 
