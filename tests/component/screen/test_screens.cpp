@@ -19,7 +19,8 @@ private slots:
     void changesAreSeen()
     {
         int seen = 0;
-        zent::screens::watch(this, [&seen] { ++seen; });
+        QObject context;
+        zent::screens::watch(&context, [&seen] { ++seen; });
         QScreen* screen = QGuiApplication::primaryScreen();
         emit screen->geometryChanged({});
         emit screen->availableGeometryChanged({});
