@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <QRegularExpression>
 #include <QStringList>
-#include <QtGlobal>
 
 #include <mutex>
 
@@ -12,52 +12,36 @@ class LogCapture
 public:
     LogCapture()
     {
-        {
-            const std::lock_guard lock(store().mutex);
-            store().lines.clear();
-            store().records.clear();
-        }
+        const std::lock_guard lock(s_mutex);
+        s_records.clear();
         m_previous = qInstallMessageHandler(collect);
     }
     ~LogCapture() { qInstallMessageHandler(m_previous); }
 
-    QStringList lines() const
-    {
-        const std::lock_guard lock(store().mutex);
-        return store().lines;
-    }
+    QStringList lines() const { return records().replaceInStrings(QRegularExpression("^\\w+ "), QString()); }
     /// The lines, each with its level before it: "debug", "warning", "critical", "fatal" or "info".
     QStringList records() const
     {
-        const std::lock_guard lock(store().mutex);
-        return store().records;
+        const std::lock_guard lock(s_mutex);
+        return s_records;
     }
     /// How many lines contain `text`.
     int count(const QString& text) const { return lines().filter(text).size(); }
     bool contains(const QString& text) const { return count(text) > 0; }
 
 private:
-    struct Store {
-        // The thread sanitizer sees this one, but not Qt's.
-        std::mutex mutex;
-        QStringList lines;
-        QStringList records;
-    };
-    static Store& store()
-    {
-        static Store store;
-        return store;
-    }
     static void collect(QtMsgType type, const QMessageLogContext&, const QString& message)
     {
         // What the platform plugin without a screen cannot do.
         if (message.startsWith("This plugin does not support"))
             return;
         static const char* const kLevels[] = {"debug ", "warning ", "critical ", "fatal ", "info "};
-        const std::lock_guard lock(store().mutex);
-        store().lines.append(message);
-        store().records.append(kLevels[type] + message);
+        const std::lock_guard lock(s_mutex);
+        s_records.append(kLevels[type] + message);
     }
 
+    // The thread sanitizer sees this one, but not Qt's.
+    static inline std::mutex s_mutex;
+    static inline QStringList s_records;
     QtMessageHandler m_previous;
 };

@@ -78,12 +78,6 @@ class TestHttpClient : public QObject
     PlatformControl m_platform;
     QTemporaryDir m_files;
 
-    void setBlackHole(bool on) { m_platform.patchState({{"black_hole", on}}); }
-    QJsonObject lastRequest()
-    {
-        const QList<QJsonObject> requests = m_platform.record("http");
-        return requests.isEmpty() ? QJsonObject() : requests.last();
-    }
     QString file(const QString& name) const { return m_files.filePath(name); }
     /// Issues a client's certificate with a key of its own, both as NAME.crt and NAME.key.
     void issue(const QString& name, const QString& authority, const QString& section, const QString& key) const
@@ -113,9 +107,8 @@ private slots:
     void init()
     {
         m_platform.clearFaults();
-        m_platform.patchState({{"listening", true},
-                               {"black_hole", false},
-                               {"tls", QJsonObject{{"certificate", "server"}, {"newest", ""}}}});
+        const QJsonObject tls{{"certificate", "server"}, {"newest", ""}};
+        m_platform.patchState({{"listening", true}, {"black_hole", false}, {"tls", tls}});
         m_platform.clearRecord();
     }
 
@@ -126,7 +119,7 @@ private slots:
         const LogCapture log;
         Client client(20);
         QCOMPARE(client.get(kStatusUrl), 200);
-        const QJsonValue connection = lastRequest().value("connection");
+        const QJsonValue connection = m_platform.record("http").last()["connection"];
         m_platform.clearRecord();
         m_platform.addFault({{"path", "/t"}}, row["action"].toObject());
         m_platform.patchState({{"tls", row["tls"].toObject()}});
@@ -141,10 +134,11 @@ private slots:
         QCOMPARE(row["post"].toBool() ? client.post(url, body) : client.get(url, body), row["result"].toInt());
         if (row.contains("reply"))
             QCOMPARE(client.reply, row["reply"].toString(QString(row["reply"].toInt(), 'x')));
-        QJsonObject request = lastRequest();
+        const QList<QJsonObject> requests = m_platform.record("http");
+        QJsonObject request = requests.value(requests.size() - 1);
         request["kept"] = request["connection"] == connection;
         request["whole"] = request["body"] == body;
-        request["count"] = m_platform.record("http").size();
+        request["count"] = requests.size();
         const QJsonObject expected = row["request"].toObject();
         for (auto value = expected.begin(); value != expected.end(); ++value)
             fixture::compare(QJsonArray{value.key(), request[value.key()]}, QJsonArray{value.key(), value.value()});
@@ -211,7 +205,7 @@ private slots:
 
     void unreachableHostIsTriedInTheBackground()
     {
-        setBlackHole(true);
+        m_platform.patchState({{"black_hole", true}});
         Client client;
         client.failPoll(kStatusUrl, "failed: no connection within 1500 ms");
         // Another port of the same host stands for itself.
@@ -224,7 +218,7 @@ private slots:
         client.failPoll("http://server.zent.test/none",
                         "not sent: server.zent.test:80 gave no reply in time, next try in * s");
         const LogCapture log;
-        setBlackHole(false);
+        m_platform.patchState({{"black_hole", false}});
         QTRY_VERIFY_WITH_TIMEOUT(log.contains("server.zent.test:443 answers again"), 10000);
         QVERIFY(m_platform.record("http").isEmpty());
         QCOMPARE(client.get(kStatusUrl), 200);
@@ -232,7 +226,7 @@ private slots:
 
     void aRefusalEndsTheOutage()
     {
-        setBlackHole(true);
+        m_platform.patchState({{"black_hole", true}});
         Client client;
         client.failPoll(kStatusUrl, "failed: no connection within 1500 ms");
         m_platform.patchState({{"black_hole", false}, {"listening", false}});
@@ -243,7 +237,7 @@ private slots:
         m_platform.patchState({{"listening", true}});
         QCOMPARE(client.poll(kStatusUrl), 200);
         // A connection that is open already falls silent instead.
-        setBlackHole(true);
+        m_platform.patchState({{"black_hole", true}});
         client.failPoll(kStatusUrl, "failed: no reply within 2000 ms");
     }
 

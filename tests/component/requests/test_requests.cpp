@@ -13,6 +13,7 @@ namespace
 {
 
 const QString kName = QStringLiteral("张 三&x=1");
+const NotifyMessageOption kOption{kName, true, 7, 5, "a+b", "0"};
 const QString kPassword = QStringLiteral("Pass\"word\\ 密");
 
 /// The status and reply that no server would give by itself.
@@ -45,10 +46,7 @@ class TestRequests : public QObject
         {"getCompanyName", [this] { m_server->getCompanyName(); }},
         {"getUserInfo", [this] { m_server->getUserInfo(kName); }},
         {"getNotifyMessageList defaults", [this] { m_messages->getNotifyMessageList(NotifyMessageOption(), {}); }},
-        {"getNotifyMessageList option",
-         [this] {
-             m_messages->getNotifyMessageList({kName, true, 7, 5, "a+b", "0"}, {});
-         }},
+        {"getNotifyMessageList option", [this] { m_messages->getNotifyMessageList(kOption, {}); }},
         {"getNotifyMessageList page 0", [this] { m_messages->getNotifyMessageList(kName, true, 0, 20, {}); }},
         {"getNotifyMessageList page 1", [this] { m_messages->getNotifyMessageList(kName, true, 1, 20, {}); }},
         {"getNotifyMessageList page 3", [this] { m_messages->getNotifyMessageList(kName, false, 3, 20, {}); }},
@@ -65,9 +63,9 @@ class TestRequests : public QObject
     static QJsonObject comparable(const QJsonObject& recorded, const QJsonObject& expected)
     {
         QJsonObject request;
+        QJsonObject headers;
         for (const QString& key : expected.keys())
             request[key] = recorded[key];
-        QJsonObject headers;
         for (const QString& key : expected["headers"].toObject().keys())
             headers[key] = recorded["headers"].toObject().value(key).toString();
         request["headers"] = headers;
@@ -83,10 +81,10 @@ private slots:
     void initTestCase()
     {
         const QMetaObject* server = m_server->metaObject();
+        const QMetaMethod noted = metaObject()->method(metaObject()->indexOfMethod("note(int,QString)"));
         for (int i = server->methodOffset(); i < server->methodCount(); ++i) {
             if (server->method(i).methodType() == QMetaMethod::Signal)
-                connect(m_server, server->method(i), this,
-                        metaObject()->method(metaObject()->indexOfMethod("note(int,QString)")));
+                connect(m_server, server->method(i), this, noted);
         }
         testfiles::write(testfiles::kMachineFile, " M 1&2\n");
         testfiles::write(testfiles::kInfoFile, R"({"protocol": "https", "server_host": "server.zent.test",
@@ -99,16 +97,19 @@ private slots:
         config->setDomainPort("80");
         config->setTerminalName(QStringLiteral("终端 1"));
     }
+    void init()
+    {
+        m_platform.clearFaults();
+        m_platform.clearRecord();
+        m_signals = {};
+    }
 
     void requests_data() { fixture::addRows("requests.json"); }
     void requests()
     {
         QFETCH(QJsonObject, row);
         const QJsonObject expected = row["request"].toObject();
-        m_platform.clearFaults();
         m_platform.addFault({{"path", "*"}}, kReply);
-        m_platform.clearRecord();
-        m_signals = {};
         const LogCapture log;
         const auto call = m_calls.value(QTest::currentDataTag());
         QVERIFY2(call, "no call of that name");
@@ -133,7 +134,6 @@ private slots:
     void messageLists()
     {
         QFETCH(QJsonObject, row);
-        m_platform.clearFaults();
         m_platform.addFault({{"path", "*"}}, row["reply"].toObject());
         QJsonObject got;
         NotifyMessageOption option;
@@ -143,12 +143,9 @@ private slots:
             QJsonArray messages;
             for (const NotifyMessage& m : response.messages)
                 messages.append(QJsonArray{m.uuid, m.uid, m.send_uid, m.title, m.content, m.created_at, m.read_at});
-            got = {{"ok", ok},
-                   {"total", response.total},
-                   {"limit", response.limit},
-                   {"offset", response.offset},
-                   {"is_not_read", response.is_not_read},
-                   {"messages", messages}};
+            got = {{"ok", ok}, {"total", response.total}, {"limit", response.limit}, {"messages", messages}};
+            got.insert("offset", response.offset);
+            got.insert("is_not_read", response.is_not_read);
         });
         QTRY_VERIFY(!got.isEmpty());
         fixture::compare(got, row["got"]);
@@ -187,7 +184,6 @@ private slots:
     void names()
     {
         QFETCH(QJsonObject, row);
-        m_platform.clearFaults();
         m_platform.addFault({{"path", "*/config"}}, row["rule"].toObject());
         m_platform.addFault({{"path", "*/verify/name"}}, row["verdict"].toObject());
         m_server->getCaCert("server.zent.test", "80");
@@ -223,7 +219,6 @@ private slots:
     void macAddress()
     {
         QFETCH(QJsonObject, row);
-        m_platform.clearFaults();
         if (row.contains("fault"))
             m_platform.addFault({{"dbus", "GetActiveConnectionInfo"}}, row["fault"].toObject());
         m_platform.patchState({{"connections", row["connections"]}});
@@ -236,7 +231,6 @@ private slots:
     {
         const QByteArray authority = testfiles::read(testfiles::kAuthorityFile);
         const QByteArray contents[] = {authority, testfiles::read("/run/room/tls/unknown_ca.crt"), authority, {}};
-        m_platform.clearFaults();
         m_platform.addFault({{"path", "*"}}, {{"body", "[]"}});
         QList<bool> results;
         for (const QByteArray& content : contents) {
@@ -254,15 +248,13 @@ private slots:
 
     void aSlowServerIsPolledLess()
     {
-        m_platform.clearFaults();
         m_platform.addFault({{"path", "*"}}, {{"delay_ms", 250}, {"status", 207}});
-        m_signals = {};
         m_server->getUserInfo(kName);
         m_server->getCompanyName();
         m_server->getUserInfo(kName);
         m_server->postQuitControl(kName);
-        fixture::compare(
-            m_signals, QJsonArray{"sigUserInfo 207 ", "sigCompanyName -4 ", "sigUserInfo -4 ", "sigQuitControl 207 "});
+        const QJsonArray expected{"sigUserInfo 207 ", "sigCompanyName -4 ", "sigUserInfo -4 ", "sigQuitControl 207 "};
+        fixture::compare(m_signals, expected);
     }
 };
 

@@ -4,53 +4,35 @@
 
 #include <QCryptographicHash>
 
-namespace
-{
-
-struct LunarDay {
-    QString monthDay, year, month, day, solarTerm, festival;
-    bool known;
-
-    explicit LunarDay(const QDate& date) { known = GetLunarDay(date, monthDay, year, month, day, solarTerm, festival); }
-    QString text() const { return QStringList({monthDay, year, month, day, solarTerm, festival}).join(' ').trimmed(); }
-};
-
-} // namespace
-
 class TestLunar : public QObject
 {
     Q_OBJECT
 
-    const QJsonObject m_data = fixture::read("lunar.json");
+    /// What is said of a day, "unknown" before the rest where there is nothing to say.
+    static QString lunarDay(const QDate& date)
+    {
+        QString monthDay, year, month, day, solarTerm, festival;
+        const bool known = GetLunarDay(date, monthDay, year, month, day, solarTerm, festival);
+        return ((known ? "" : "unknown ") + QStringList{monthDay, year, month, day, solarTerm, festival}.join(' '))
+            .trimmed();
+    }
 
 private slots:
-    void publishedDays()
+    void everyDayIsAsPublished()
     {
         // With leap months, without a festival in the copy, and one that reaches into the next Gregorian year; New
         // Year's Eve in a short last month, and the 29th day of a long one. The day before Qingming may meet a lunar
-        // festival, which then follows without a separator.
-        const QJsonObject days = m_data["days"].toObject();
-        QVERIFY(!days.isEmpty());
-        for (auto day = days.begin(); day != days.end(); ++day) {
-            const LunarDay found(QDate::fromString(day.key(), Qt::ISODate));
-            fixture::compare(QString(day.key() + ' ' + found.text()), QString(day.key() + ' ' + day->toString()));
-        }
-    }
-
-    void wholeCalendarIsAsItWas()
-    {
+        // festival, which then follows without a separator. Days of other years are unknown.
+        const QJsonObject data = fixture::read("lunar.json");
+        const QJsonObject days = data["days"].toObject();
+        for (auto day = days.begin(); day != days.end(); ++day)
+            QCOMPARE(day.key() + ' ' + lunarDay(QDate::fromString(day.key(), Qt::ISODate)),
+                     day.key() + ' ' + day->toString());
         // Of the tables that were compared with published calendars; a change of any day shows here.
         QCryptographicHash all(QCryptographicHash::Sha256);
-        for (QDate date(1901, 1, 1); date <= QDate(2099, 12, 31); date = date.addDays(1)) {
-            const LunarDay day(date);
-            QVERIFY2(day.known, qPrintable(date.toString(Qt::ISODate)));
-            all.addData(day.text().toUtf8());
-        }
-        fixture::compare(QString(all.result().toHex()), m_data["checksum"]);
-        for (const QDate& date : {QDate(1900, 12, 31), QDate(2100, 1, 1), QDate(), QDate(-1, 1, 1)}) {
-            const LunarDay day(date);
-            QVERIFY2(!day.known && day.text().isEmpty(), qPrintable(date.toString(Qt::ISODate)));
-        }
+        for (QDate date(1901, 1, 1); date <= QDate(2099, 12, 31); date = date.addDays(1))
+            all.addData(lunarDay(date).toUtf8());
+        fixture::compare(QString(all.result().toHex()), data["checksum"]);
     }
 };
 

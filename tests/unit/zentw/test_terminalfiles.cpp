@@ -53,23 +53,19 @@ class TestTerminalFiles : public QObject
     /// What each getter of the store returns, with its verdict.
     QJsonObject read()
     {
-        bool ok = false;
-        const auto verdict = [&ok] { return std::exchange(ok, false); };
-        QJsonObject got;
-        const QString machine = m_store->getMachineID(&ok, false);
-        got["machine"] = QJsonArray{machine, verdict()};
-        const bool isDomain = m_store->isDomain(&ok);
-        got["isDomain"] = QJsonArray{isDomain, verdict()};
-        const QString alias = m_store->getTerminalAlias(&ok);
-        got["alias"] = QJsonArray{alias, verdict()};
-        QString host = "kept";
-        QString port = "kept";
+        bool ok[4] = {};
+        const QString machine = m_store->getMachineID(&ok[0], false);
+        const bool isDomain = m_store->isDomain(&ok[1]);
+        const QString alias = m_store->getTerminalAlias(&ok[2]);
+        QString host = "kept", port = "kept";
         const bool both = m_store->getHostAndPort(host, port);
-        got["hostAndPort"] = QJsonArray{host, port, both};
-        const zent::base::UserInfo info = m_store->getUserInfo(&ok);
-        got["all"] = QJsonArray{info.isDomain,   info.serverHost,   info.serverPort, info.domainHost,
-                                info.domainPort, info.terminalName, verdict()};
-        return got;
+        const UserInfo all = m_store->getUserInfo(&ok[3]);
+        return {{"machine", QJsonArray{machine, ok[0]}},
+                {"isDomain", QJsonArray{isDomain, ok[1]}},
+                {"alias", QJsonArray{alias, ok[2]}},
+                {"hostAndPort", QJsonArray{host, port, both}},
+                {"all", QJsonArray{all.isDomain, all.serverHost, all.serverPort, all.domainHost, all.domainPort,
+                                   all.terminalName, ok[3]}}};
     }
 
 private slots:
@@ -256,11 +252,9 @@ private slots:
     void longTextsAreCut()
     {
         using zent::display::cut;
-        const QChar ellipsis(0x2026);
-        QCOMPARE(cut(QString(1000, 'x')), QString(1000, 'x'));
-        QCOMPARE(cut(QString(1001, 'x')), QString(1000, 'x') + ellipsis);
-        QCOMPARE(cut("a😀b", 2), QString("a") + ellipsis);
-        QCOMPARE(cut("a😀b", 3), QString("a😀") + ellipsis);
+        const QString longest(1000, 'x');
+        QCOMPARE(QStringList({cut(longest), cut(longest + 'x'), cut("a😀b", 2), cut("a😀b", 3)}),
+                 QStringList({longest, longest + "…", "a…", "a😀…"}));
     }
 
     void jsonReader_data() { fixture::addRows("jsonreader.json"); }
