@@ -212,8 +212,6 @@ private slots:
             m_platform.setUnread(row.unread);
             if (row.fails)
                 m_platform.addFault(m_list, {{"status", 500}});
-            // Polls within one second share their URL and thus their callback.
-            QTest::qWait(1001 - QTime::currentTime().msec());
             poll.unreadMessages();
             QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
             m_platform.clearFaults();
