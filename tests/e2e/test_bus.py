@@ -15,15 +15,6 @@ FULLZONE = "/com/vantor/tarn/Fullzone"
 OBJECTS = {NOTIFICATION: "com.vantor.tarn.Notification", FULLZONE: "com.vantor.tarn.Fullzone"}
 
 
-def gdbus(*arguments):
-    return subprocess.run(["gdbus", *arguments], capture_output=True, text=True, check=False)
-
-
-def notification(method, *arguments):
-    return gdbus("call", "--session", "-d", SERVICE, "-o", NOTIFICATION, "-m",
-                 "com.vantor.tarn.Notification." + method, *arguments)
-
-
 def interfaces(path, text):
     """The object's own interfaces, and their members with the arguments' types and directions."""
     own = [i for i in ElementTree.fromstring(text).findall("interface") if ".freedesktop.DBus." not in i.get("name")]
@@ -40,45 +31,49 @@ class Bus(ClientTest):
     def setUp(self):
         super().setUp()
         self.start()
-        self.until("the name on the bus", lambda: gdbus("introspect", "--session", "-d", SERVICE, "-o",
-                                                        NOTIFICATION).returncode == 0)
+        self.until("the name on the bus", lambda: self.gdbus("introspect", NOTIFICATION))
+
+    def gdbus(self, command, path, *arguments):
+        return self.desktop.run("gdbus", command, "--session", "-d", SERVICE, "-o", path, *arguments)
+
+    def push(self, method, *arguments):
+        return self.gdbus("call", NOTIFICATION, "-m", f"{OBJECTS[NOTIFICATION]}.{method}", *arguments)
 
     def test_objects_offer_what_their_files_describe_and_nothing_else(self):
         bus = Gio.bus_get_sync(Gio.BusType.SESSION)
         other_type = GLib.Variant("(v)", (GLib.Variant("s", "open"),))
         for path, name in OBJECTS.items():
-            live = interfaces(path, gdbus("introspect", "--session", "--xml", "-d", SERVICE, "-o", path).stdout)
+            live = interfaces(path, self.gdbus("introspect", path, "--xml"))
             self.assertEqual(live, interfaces(path, read(os.path.join(TREE, "data", name + ".xml"))))
             for method in (member[1] for member in live[1][0][1] if member[0] == "method"):
                 with self.assertRaisesRegex(GLib.Error, "UnknownMethod", msg=method):
                     bus.call_sync(SERVICE, path, name, method, other_type, None, 0, 5000, None)
         self.assertEqual(roomclient.record("process", name="gio"), [])
 
-    def test_pushed_message_is_announced_once(self):
+    def test_pushed_message_is_announced_once_and_shown(self):
+        # As a balloon, where the desktop's service is missing.
+        before = len(self.desktop.windows())
+        self.push("Notify", "1", "zhangsan", "标题", "正文", "管理员")
+        self.until("the balloon", lambda: len(self.desktop.windows()) > before)
+        self.assertNotIn("neither a notification service", "".join(roomclient.syslog_lines()))
         with subprocess.Popen(["gdbus", "monitor", "--session", "-d", SERVICE, "-o", NOTIFICATION],
                               stdout=subprocess.PIPE, text=True) as monitor:
             self.addCleanup(monitor.kill)
             while "is owned by" not in monitor.stdout.readline():
                 pass
-            notification("Notify", "1", "lisi", "a <b>", "b %1", "c")
-            notification("AgencyNotify", "a", "b")
-            notification("Notify", "1", "", "", "", "")
+            self.push("Notify", "1", "lisi", "a <b>", "b %1", "c")
+            self.push("AgencyNotify", "a", "b")
+            self.push("Notify", "1", "", "", "", "")
             heard = [monitor.stdout.readline().partition("onMessage ")[2].strip() for _ in range(2)]
             monitor.kill()
         self.assertEqual(heard, ["(1, 'lisi', 'a <b>', 'b %1', 'c')", "(1, '', '', '', '')"])
-
-    def test_balloon_where_the_service_is_missing(self):
-        before = len(self.desktop.windows())
-        notification("Notify", "1", "zhangsan", "标题", "正文", "管理员")
-        self.until("the balloon", lambda: len(self.desktop.windows()) > before)
-        self.assertNotIn("neither a notification service", "".join(roomclient.syslog_lines()))
 
     def test_devices_are_unmounted_before_the_reply(self):
         os.makedirs("/run/user/1000/gvfs/mtp:host=Foo_SER1", exist_ok=True)
         ended = os.path.join(roomclient.ROOM, "gio.ended")
         roomclient.set_standin("gio", hook=f"sleep 0.3; : > {ended}")
         self.addCleanup(roomclient.set_standin, "gio")
-        self.assertEqual(notification("GioMount", "Foo", "Bar", "SER1", "1000").returncode, 0)
+        self.assertTrue(self.push("GioMount", "Foo", "Bar", "SER1", "1000"))
         self.assertTrue(os.path.exists(ended))
 
 

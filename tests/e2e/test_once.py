@@ -14,10 +14,6 @@ class Once(ClientTest):
         self.stage = Stage(self.desktop)
         self.start_shown()
 
-    def open(self, name):
-        self.stage.click(name)
-        return self.stage.window(name)
-
     def press(self, *keys):
         """Presses the keys where the focus is, within 400 ms."""
         self.desktop.run("xdotool", "key", "--delay", "100", *keys)
@@ -27,7 +23,8 @@ class Once(ClientTest):
 
     def test_password_is_changed_once(self):
         roomclient.add_fault({"dbus": "ModifyUserPassword"}, {"value": REFUSED, "delay_ms": 1500})
-        dialog = self.open(PASSWORD)
+        self.stage.click(PASSWORD)
+        dialog = self.stage.window(PASSWORD)
         self.stage.keys(dialog, *"old", "Tab", *"new", "Tab", *"new")
         confirm = self.stage.place("确认")
         for round_ in range(2):
@@ -44,7 +41,8 @@ class Once(ClientTest):
 
     def test_terminal_is_released_and_rebooted_once(self):
         roomclient.add_fault({"path": "*/remove_status"}, {"body": '{"code": 1, "msg": "no"}', "delay_ms": 1200})
-        dialog = self.open(RELEASE)
+        self.stage.click(RELEASE)
+        dialog = self.stage.window(RELEASE)
         self.stage.type(dialog, "Admin@2026")
         others = {window for window, _ in self.desktop.windows()}
         self.press("Return", "Return", "Return", "Return", "Escape")

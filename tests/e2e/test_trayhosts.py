@@ -28,19 +28,16 @@ MOST_WAKE_UPS = 70
 REGISTRY = os.path.join(TREE, "sandbox/registry.py")
 
 
-def gdbus(service, path, method, *arguments):
-    """The answer of a method on the session bus; empty when there is none within a second."""
-    result = subprocess.run(["gdbus", "call", "--session", "--timeout", "1", "-d", service, "-o", path, "-m", method,
-                             *arguments], capture_output=True, text=True, check=False)
-    return result.stdout
-
-
 class HostTest(ClientTest):
     tray = False
     host = "start_notifier_tray"
 
     def start_host(self):
         return getattr(self.desktop, self.host)()
+
+    def call(self, name, path, method, *arguments):
+        return self.desktop.run("gdbus", "call", "--session", "--timeout", "1", "-d", name, "-o", path, "-m", method,
+                                *arguments)
 
     def wait_icon(self, seconds=ICON_SECONDS):
         self.until("the icon", self.desktop.icon, seconds)
@@ -50,8 +47,8 @@ class HostTest(ClientTest):
         with self.assertRaises(subprocess.TimeoutExpired):
             self.client.wait(seconds)
         self.assertFalse(any("showSystemTrayIcon" in line for line in roomclient.syslog_lines()))
-        self.assertEqual(gdbus("com.vantor.tarn", "/com/vantor/tarn/Notification",
-                               "com.vantor.tarn.Notification.Notify", "1", "lisi", "a", "b", "c"), "()\n")
+        self.assertEqual(self.call("com.vantor.tarn", "/com/vantor/tarn/Notification",
+                                   "com.vantor.tarn.Notification.Notify", "1", "lisi", "a", "b", "c"), "()\n")
         roomclient.wait_syslog("message for another user not shown")
 
 
@@ -100,8 +97,8 @@ class Registry(HostTest):
         self.desktop.spawn(["/usr/bin/python3", "-B", REGISTRY])
         self.until("the registry", lambda: "false" in self.desktop.registry("IsStatusNotifierHostRegistered"))
         self.lives()
-        gdbus("org.kde.StatusNotifierWatcher", "/StatusNotifierWatcher",
-              "org.kde.StatusNotifierWatcher.RegisterStatusNotifierHost", "org.kde.StatusNotifierHost-1")
+        self.call("org.kde.StatusNotifierWatcher", "/StatusNotifierWatcher",
+                  "org.kde.StatusNotifierWatcher.RegisterStatusNotifierHost", "org.kde.StatusNotifierHost-1")
         self.until("the item", self.has_item, ICON_SECONDS)
 
     def test_silence_holds_up_nothing(self):

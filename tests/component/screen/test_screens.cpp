@@ -37,7 +37,6 @@ private slots:
     void workArea()
     {
         QFETCH(QJsonObject, row);
-        QList<QWidget*> panels;
         QWidget parent;
         for (const QJsonValue& bands : row["panels"].toArray()) {
             auto* panel = new QWidget(&parent, Qt::Window | Qt::FramelessWindowHint);
@@ -48,10 +47,8 @@ private slots:
             xwindows::setProperty(panel->winId(), values.size() == 4 ? "_NET_WM_STRUT" : "_NET_WM_STRUT_PARTIAL",
                                   values);
             panel->show();
-            panels.append(panel);
-        }
-        for (QWidget* panel : panels)
             QVERIFY(QTest::qWaitForWindowExposed(panel));
+        }
         QTRY_COMPARE(sides(zent::screens::availableGeometry()), row["area"]);
         QCOMPARE(sides(zent::screens::fullGeometry()), (QJsonArray{1024, 0, 1280, 800}));
         QCOMPARE(zent::screens::all().size(), 2);
