@@ -43,14 +43,14 @@ class TestFaults : public QObject
     /// The fault under test.
     QJsonObject m_row;
 
-    QComboBox* scenes() const { return m_window->findChild<QComboBox*>(); }
+    int scenes() const { return m_window->findChild<QComboBox*>()->count(); }
     /// What the panel and the count say.
     QString known() const
     {
         QStringList texts;
         for (const char* label : {"macValue", "userRoleValue", "terminalValue", "nameValue"})
             texts.append(m_window->findChild<QLabel*>(label)->text());
-        return texts.join('|') + QString(" %1 %2").arg(scenes()->count()).arg(MainWindow::unreadMessageCount);
+        return texts.join('|') + QString(" %1 %2").arg(scenes()).arg(MainWindow::unreadMessageCount);
     }
     void start()
     {
@@ -93,7 +93,7 @@ class TestFaults : public QObject
         m_readSuccesses = 0;
         m_window->unreadMessages();
         QNotification::qInstance->readNotifyMessage("0",
-                                                    [this](bool ok, const QString&) { m_readSuccesses += ok ? 1 : 0; });
+                                                    [this](bool ok, const auto&) { m_readSuccesses += ok ? 1 : 0; });
         m_window->getAllUserEnvironment();
         QCoreApplication::processEvents();
         emit m_window->startgetMeInfo();
@@ -112,10 +112,7 @@ class TestFaults : public QObject
     /// Requests within one second share their URL and thus their callback.
     static void nextSecond() { QTest::qWait(1001 - QTime::currentTime().msec()); }
 
-    QString failedPoll(const char* what) const
-    {
-        return QString("%1 failed! %2").arg(what).arg(m_row["status"].toInt());
-    }
+    QString failed(const char* poll) const { return QString("%1 failed! %2").arg(poll).arg(m_row["status"].toInt()); }
     QString first() const { return QString("%1|N1|PC|%1 3 2").arg(QTest::currentDataTag()); }
     QTimer* retry() const { return m_window->findChild<QTimer*>("scenesAgain"); }
     bool scenesAnswer() const { return m_row["state"].toObject().contains("tls"); }
@@ -134,10 +131,10 @@ class TestFaults : public QObject
         m_beat.start(5);
         const QString unknown = known();
         for (const char* poll : {"getusrInfo", "getCompanyName"})
-            QTRY_VERIFY2_WITH_TIMEOUT(log.contains(failedPoll(poll)), qPrintable(log.lines().join('\n')), kPatienceMs);
+            QTRY_VERIFY2_WITH_TIMEOUT(log.contains(failed(poll)), qPrintable(log.lines().join('\n')), kPatienceMs);
         QCOMPARE(known(), unknown);
         setFault({}, {});
-        QTRY_VERIFY_WITH_TIMEOUT(scenes()->count() == 3, kPatienceMs);
+        QTRY_VERIFY_WITH_TIMEOUT(scenes() == 3, kPatienceMs);
         m_window->unreadMessages();
         QTRY_COMPARE_WITH_TIMEOUT(known(), first(), kPatienceMs);
         QVERIFY(!retry()->isActive());
@@ -150,9 +147,9 @@ class TestFaults : public QObject
         const LogCapture log;
         setFault(m_row["state"].toObject(), m_row["action"].toObject());
         askEverything();
-        QStringList expected = m_row["log"].toVariant().toStringList();
+        QStringList expected = m_row["log"].toVariant().toStringList() << failed("getusrInfo");
         // Nothing while the answers are awaited.
-        if (expected.isEmpty()) {
+        if (m_row["log"].toArray().isEmpty()) {
             QVERIFY(QNotification::qInstance->pendingRequests() > 0);
             QCOMPARE(m_readSuccesses, 0);
         } else {
@@ -161,12 +158,10 @@ class TestFaults : public QObject
             QTRY_COMPARE(m_readSuccesses, status == 200 ? 1 : 0);
         }
         QTRY_COMPARE(m_boxes.texts, QStringList(m_row["box"].toString()));
-        expected << failedPoll("getusrInfo");
         // The poll after one that took long, as on a busy machine, is held back.
-        QVERIFY(log.count(failedPoll("getCompanyName")) == 1 || log.contains("is slow to answer"));
+        QVERIFY(log.count(failed("getCompanyName")) == 1 || log.contains("is slow to answer"));
         if (status < 0)
-            expected << "client/remove\" failed: "
-                     << "client/remove_status\" failed: ";
+            expected += {"client/remove\" failed: ", "client/remove_status\" failed: "};
         for (const QString& line : qAsConst(expected))
             QVERIFY2(log.count(line) == 1, qPrintable(line + "\n\n" + log.lines().join('\n')));
         if (!scenesAnswer())
@@ -185,7 +180,7 @@ class TestFaults : public QObject
             m_window->getAllUserEnvironment();
         tryRelease();
         QTRY_COMPARE(m_boxes.texts, QStringList(kRefused));
-        QTRY_COMPARE_WITH_TIMEOUT(scenes()->count(), 6, kPatienceMs);
+        QTRY_COMPARE_WITH_TIMEOUT(scenes(), 6, kPatienceMs);
         QTRY_COMPARE_WITH_TIMEOUT(QNotification::qInstance->pendingRequests(), 0, kPatienceMs);
         m_platform.setUnread(5);
         nextSecond();
@@ -251,10 +246,8 @@ private slots:
         if (!drips) {
             m_window->getusrInfo();
             m_window->getAllUserEnvironment();
-            const auto ended = [&log] {
-                return log.contains("get net reqruest failed!") || log.contains("parse config.json file failed.");
-            };
-            QTRY_VERIFY_WITH_TIMEOUT(ended(), kPatienceMs);
+            const QRegularExpression ended("get net reqruest failed!|parse config.json file failed.");
+            QTRY_VERIFY_WITH_TIMEOUT(!log.lines().filter(ended).isEmpty(), kPatienceMs);
         }
         QVERIFY2(memory("VmHWM") - before < 40 * 1024, qPrintable(QString::number(memory("VmHWM") - before)));
         QTRY_VERIFY_WITH_TIMEOUT(memory("VmRSS") - before < 4 * 1024, 60000);
