@@ -303,6 +303,10 @@ private slots:
         QCOMPARE(toolTip(label), "own");
         QCOMPARE(ToolkitLabel::plainToolTip("a < b"), "a < b");
         QCOMPARE(ToolkitLabel::plainToolTip("<b>a</b>"), "&lt;b&gt;a&lt;/b&gt;");
+    }
+
+    void comboBoxTellsWhatItCuts()
+    {
         ToolkitComboBox box;
         box.setFont(font(14));
         box.addItem("<b>终</b>");
