@@ -79,9 +79,10 @@ inline QString text(const QVariant& value)
 /// The properties that have another value than those of a new object of the same class of Qt.
 inline QString properties(const QObject* object)
 {
-    static const QList<QObject*> kNew{new QWidget,     new QFrame,      new QLabel,    new QLineEdit,
-                                      new QPushButton, new QToolButton, new QComboBox, new QCheckBox,
-                                      new QDialog,     new QTimer,      new QAction};
+    // Never destroyed, since the application ends before.
+    static const auto& kNew =
+        *new QList<QObject*>{new QWidget,   new QFrame,    new QLabel,  new QLineEdit, new QPushButton, new QToolButton,
+                             new QComboBox, new QCheckBox, new QDialog, new QTimer,    new QAction};
     // What the font, the layout or the platform decides, and what is read elsewhere.
     static const QRegularExpression kSkipped(
         "^(objectName|.*[gG]eometry|x|y|pos|(frameR|r)ect|(?!icon|minimumS|maximumS).*[sS]ize|.*Width|"
