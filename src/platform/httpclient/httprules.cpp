@@ -129,7 +129,7 @@ void limitReply(QNetworkReply* reply)
     };
     noteLookup(reply);
     // More than is allowed tells the reply that is too large. Over plain HTTP Qt stops up to 128 KiB short.
-    constexpr qint64 kMargin = 256 * 1024;
+    constexpr qint64 kMargin = 256LL * 1024;
     reply->setReadBufferSize(kMaxReplyBytes + kMargin);
     QObject::connect(reply, &QNetworkReply::metaDataChanged, reply, check);
     QObject::connect(reply, &QNetworkReply::readyRead, reply, check);
