@@ -145,11 +145,7 @@ inline void compare(const QWidget* window, const QJsonValue& lines)
         if (child->isWidgetType() || qobject_cast<const QTimer*>(child) || qobject_cast<const QAction*>(child))
             got.append(line(child, window));
     }
-    const QStringList expected = lines.toVariant().toStringList();
-    for (int i = 0; i < qMax(got.size(), expected.size()); ++i) {
-        const QString both = "expected: " + expected.value(i) + "\ngot: " + got.value(i) + "\nof:\n";
-        QVERIFY2(fixture::isLine(got.value(i), expected.value(i)), qPrintable(both + got.join('\n')));
-    }
+    fixture::compareLines(got, lines);
 }
 
 } // namespace description

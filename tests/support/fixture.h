@@ -51,15 +51,20 @@ inline bool isLine(const QString& line, const QString& expected)
     return QRegularExpression(pattern, QRegularExpression::DotMatchesEverythingOption).match(line).hasMatch();
 }
 
-/// Fails where the log is not made of these lines, in this order.
-inline void compareLog(const LogCapture& log, const QJsonValue& lines)
+/// Fails where the lines differ from the expected ones, or their order or number does.
+inline void compareLines(const QStringList& got, const QJsonValue& lines)
 {
-    const QStringList got = log.records();
     const QStringList expected = lines.toVariant().toStringList();
     for (int i = 0; i < qMax(got.size(), expected.size()); ++i) {
         const QString both = "expected: " + expected.value(i) + "\ngot: " + got.value(i) + "\nof:\n";
         QVERIFY2(isLine(got.value(i), expected.value(i)), qPrintable(both + got.join('\n')));
     }
+}
+
+/// Fails where the log is not made of these lines, in this order.
+inline void compareLog(const LogCapture& log, const QJsonValue& lines)
+{
+    compareLines(log.records(), lines);
 }
 
 /// Fails where one of the lines is not in the log, which several threads wrote.

@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "boxcloser.h"
 #include "closeguarddialog.h"
 #include "dbusnames.h"
 #include "fileconfig.h"
@@ -15,19 +14,13 @@
 #include "platformcontrol.h"
 #include "processrecord.h"
 #include "sessionhost.h"
-#include "sizedicon.h"
 #include "toolkittitlebar.h"
-#include "trayhost.h"
-#include "trayregistry.h"
 
 #include <QAbstractButton>
 #include <QApplication>
 #include <QComboBox>
 #include <QDBusConnectionInterface>
 #include <QLabel>
-#include <QLayout>
-#include <QPlainTextEdit>
-#include <QPushButton>
 #include <QScreen>
 #include <QSignalSpy>
 
@@ -39,7 +32,6 @@ class TestMainWindow : public QObject
     Q_OBJECT
 
     const QString m_sceneFile = QString("/home/zhangsan/.cache/vantor/CurrentScene");
-    const QString m_listPath = QStringLiteral("/notification/v2/list");
     const QJsonObject m_networkDaemon{{"dbus", "GetActiveConnectionInfo"}};
     PlatformControl m_platform;
     std::unique_ptr<MainWindow> m_window;
@@ -64,31 +56,6 @@ class TestMainWindow : public QObject
     void click(const char* button) const { m_window->findChild<QAbstractButton*>(button)->click(); }
     QComboBox* sceneBox() const { return m_window->findChild<QComboBox*>(); }
     NoticeDialog* notice() const { return m_window->findChild<NoticeDialog*>(); }
-    QPushButton* first() const { return notice()->firstButton(); }
-    QPushButton* next() const { return notice()->nextButton(); }
-    QString shownTitle() const { return notice()->findChild<QPlainTextEdit*>()->toPlainText(); }
-    /// The texts of the message dialog, with what else each view and button is.
-    QJsonArray noticeContent(const QString& time) const
-    {
-        QJsonArray content;
-        for (const QLabel* label : notice()->findChildren<QLabel*>()) {
-            if (!label->text().isEmpty())
-                content.append(label->text().replace(QNotification::formatTime(time, true), "TIME"));
-        }
-        for (const QPlainTextEdit* view : notice()->findChildren<QPlainTextEdit*>()) {
-            QStringList words{view->toPlainText()};
-            for (const char* property : {"objectName", "accessibleName", "readOnly", "tabChangesFocus", "frameShape",
-                                         "verticalScrollBarPolicy", "horizontalScrollBarPolicy", "height"})
-                words.append(view->property(property).toString());
-            for (const int number : {view->font().pixelSize(), view->font().weight(), int(view->wordWrapMode()),
-                                     int(view->viewport()->autoFillBackground())})
-                words.append(QString::number(number));
-            content.append(words.join(' '));
-        }
-        for (const QPushButton* button : {first(), next()})
-            content.append(button->isVisible() ? button->text() + QString(" %1").arg(button->width()) : "hidden");
-        return content;
-    }
     QPoint centred(const QWidget& window) const
     {
         const QSize rest = QGuiApplication::primaryScreen()->size() - window.size();
@@ -101,16 +68,6 @@ class TestMainWindow : public QObject
         MainWindow::unreadMessageCount = 0;
         m_window = std::make_unique<MainWindow>(nullptr, 1029);
     }
-    void openNotice(int unread)
-    {
-        makeWindow(unread);
-        // The polls' requests would be counted with those of the dialog.
-        for (QTimer* poll : m_window->findChildren<QTimer*>())
-            poll->stop();
-        m_window->openNotice();
-        QTRY_VERIFY(notice()->isVisible());
-    }
-
 private slots:
     void init()
     {
@@ -253,76 +210,6 @@ private slots:
         }
     }
 
-    void clicksOnTheIcon()
-    {
-        using Tray = QSystemTrayIcon;
-        auto* icon = m_window->findChild<TrayIcon*>();
-        const QPoint corner = m_window->pos();
-        m_window->move(-50, 10);
-        const std::pair<Tray::ActivationReason, bool> clicks[] = {
-            {Tray::Trigger, false}, {Tray::Trigger, true},      {Tray::Context, true},
-            {Tray::Trigger, true},  {Tray::Unknown, true},      {Tray::DoubleClick, true},
-            {Tray::Trigger, false}, {Tray::MiddleClick, false}, {Tray::Trigger, true}};
-        for (const auto& [reason, shown] : clicks) {
-            emit icon->activated(reason);
-            QVERIFY2(m_window->isVisible() == shown, qPrintable(QString("click %1").arg(reason)));
-        }
-        QCOMPARE(m_window->pos(), corner);
-        QTRY_VERIFY(m_window->hasFocus());
-        m_window->close();
-        QVERIFY(m_window->isHidden());
-        emit m_window->findChild<ToolkitTitlebar*>()->windowDragged();
-        m_window->move(-50, 10);
-        emit icon->activated(Tray::Trigger);
-        QVERIFY(m_window->isVisible());
-        QCOMPARE(m_window->pos(), QPoint(-50, 10));
-
-        // Of a host that reports every click as one of its own.
-        QList<int> meant;
-        TrayClicks single;
-        for (const auto reason : {Tray::Trigger, Tray::Trigger, Tray::Trigger, Tray::MiddleClick, Tray::Trigger})
-            single.pass(Tray(), reason, [&](auto meaning) { meant.append(meaning); });
-        QCOMPARE(meant, QList<int>({3, 2, 3, 4, 3}));
-    }
-
-    void shutdownEndsTheWaitForATray()
-    {
-        m_window->setSysThemetype(2);
-        for (const bool ended : {true, false}) {
-            makeWindow(0);
-            const SessionHost host(*m_window);
-            m_window->show();
-            if (ended)
-                m_window->shutdown();
-            QCOMPARE(m_window->isHidden(), ended);
-            const TrayHostWatch witness;
-            QSignalSpy appeared(&witness, &TrayHostWatch::hostAppeared);
-            const LogCapture log;
-            const TrayRegistry registry;
-            QTRY_COMPARE(appeared.count(), 1);
-            QVERIFY(log.records().contains("info TrayHostWatch a tray host is there"));
-            QCOMPARE(m_window->findChild<QSystemTrayIcon*>() != nullptr, !ended);
-            // Of a tray that shows no balloons, or of none.
-            emit host.findChild<Notification*>()->onMessage(1, "", "title", "text", "sender");
-            QTRY_VERIFY(log.records().contains(
-                "warning SessionHost neither a notification service nor a tray shows the message"));
-        }
-        const auto* icon = m_window->findChild<QSystemTrayIcon*>();
-        QCOMPARE(icon->toolTip(), QStringLiteral("终端域管平台"));
-        const QList<QSize> sizes{{16, 16}, {22, 22}, {24, 24}, {32, 32}, {48, 48}, {64, 64}};
-        QCOMPARE(icon->icon().availableSizes(), sizes);
-        const char* const files[] = {"finalogo", "tarn", "tarn_dark"};
-        for (int theme = 0; theme <= 2; ++theme) {
-            if (theme > 0)
-                m_window->setSysThemetype(theme);
-            const QImage drawn = zent::sizedIcon(QString(":/images/%1.svg").arg(files[theme])).pixmap(64).toImage();
-            QVERIFY2(!drawn.isNull() && icon->icon().pixmap(64).toImage() == drawn, files[theme]);
-        }
-        QVERIFY(icon->isVisible());
-        m_window->shutdown();
-        QVERIFY(!icon->isVisible());
-    }
-
     void outputIsCutIntoPiecesOfWholeCharacters()
     {
         const QString x(300, 'x'), middle(100, QChar(0x4e2d));
@@ -401,110 +288,6 @@ private slots:
         QCOMPARE(log.records().count("debug closeguard get username : \"zhangsan\""), 2);
         emit m_window->findChild<closeGuarddialog*>()->closeall();
         QVERIFY(m_window->isHidden());
-    }
-
-    void noticeShowsTheNewestMessageAndRefreshes_data() { fixture::addRows("noticedialog.json"); }
-    void noticeShowsTheNewestMessageAndRefreshes()
-    {
-        QFETCH(QJsonObject, row);
-        makeWindow(row["unread"].toInt());
-        const LogCapture log;
-        // The dialog's wait gathers what comes meanwhile into one question.
-        for (int i = 0; i < 50; ++i)
-            QMetaObject::invokeMethod(m_window->findChild<TrayIcon*>(), &TrayIcon::balloonClicked,
-                                      Qt::QueuedConnection);
-        QTRY_VERIFY(notice()->isVisible());
-        QCOMPARE(log.count("showNotice"), 50);
-        fixture::compare(QJsonArray::fromStringList(log.records().filter("noticeDialog::")), row["log"]);
-        QVERIFY(notice()->windowFlags().testFlag(Qt::WindowStaysOnTopHint));
-        const auto views = notice()->findChildren<QPlainTextEdit*>();
-        QCOMPARE(notice()->focusWidget(), views.last());
-        fixture::compare(noticeContent(row["time"].toString()), row["shown"]);
-        const QLayout* layout = notice()->findChild<QWidget*>("informationWidget")->layout();
-        QCOMPARE(layout->indexOf(views[0]), 0);
-        QCOMPARE(layout->indexOf(views[1]), layout->count() - 2);
-        // A refresh leaves the focus where it is.
-        views[0]->setFocus();
-        m_platform.addFault({{"path", m_listPath}}, row["reply"].toObject());
-        m_window->openNotice();
-        QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
-        fixture::compare(first()->text(), row["text"]);
-        fixture::compare(next()->isVisible(), row["next"]);
-        for (QWidget* inTabOrder : QWidgetList{views[0], views[1], first()}) {
-            QCOMPARE(notice()->focusWidget(), inTabOrder);
-            QTest::keyClick(inTabOrder, Qt::Key_Tab);
-        }
-        QVERIFY(next()->isHidden() || notice()->focusWidget() == next());
-        first()->click();
-        const int marked = row["marked"].toInt();
-        QCOMPARE(notice()->isHidden(), marked == 0);
-        QTRY_COMPARE(m_platform.requests("/notification/v2/read").size(), marked);
-        QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
-    }
-
-    void oneMessageIsMarkedReadOnce()
-    {
-        openNotice(1);
-        QSignalSpy read(m_window.get(), &MainWindow::readNotify);
-        BoxCloser boxes;
-        m_platform.addFault({{"path", "*/read"}}, {{"status", 500}});
-        first()->click();
-        QTRY_COMPARE(boxes.texts.size(), 1);
-        QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
-        QVERIFY(read.isEmpty());
-        m_platform.clearFaults();
-        m_platform.clearRecord();
-        first()->click();
-        first()->click();
-        QTRY_COMPARE(read, QList<QVariantList>{{"0"}});
-        QCOMPARE(m_platform.requests("/notification/v2/read").size(), 1);
-        QTRY_COMPARE(first()->text(), QStringLiteral("关闭"));
-        QTRY_VERIFY(!first()->signalsBlocked());
-        first()->click();
-        QVERIFY(notice()->isHidden());
-        // What is read elsewhere refreshes an open dialog only, also one behind another window.
-        for (const bool open : {false, true}) {
-            notice()->setVisible(open);
-            m_window->show();
-            m_window->activateWindow();
-            m_platform.clearRecord();
-            m_window->onReadAllMessage();
-            QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
-            QCOMPARE(m_platform.requests(m_listPath).size(), open ? 1 : 0);
-        }
-    }
-
-    void severalMessagesAreSteppedThrough()
-    {
-        openNotice(3);
-        QCOMPARE(next()->text(), QStringLiteral("下一条(3)"));
-        QSignalSpy read(m_window.get(), &MainWindow::readNotify);
-        next()->click();
-        QVERIFY(!next()->isEnabled());
-        QTRY_COMPARE(next()->text(), QStringLiteral("下一条(2)"));
-        QCOMPARE(read, QList<QVariantList>{{"2"}});
-        QVERIFY(next()->isEnabled());
-        QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 1 %2"));
-
-        m_platform.addFault({{"path", "/notification/v2/*"}}, {{"status", 500}});
-        BoxCloser boxes;
-        const LogCapture log;
-        bool logged = false;
-        boxes.instead = [&logged, &log] {
-            logged = log.contains("/read\" failed: status 500");
-            QApplication::activeModalWidget()->close();
-        };
-        // The request is under way when this returns.
-        m_window->openNotice();
-        next()->click();
-        QTRY_COMPARE(boxes.texts.size(), 1);
-        QVERIFY2(boxes.texts.constFirst().startsWith("消息调用警告Error"), qPrintable(boxes.texts.constFirst()));
-        QTRY_COMPARE(QNotification::qInstance->pendingRequests(), 0);
-        QVERIFY(logged && read.size() == 1 && !next()->isEnabled());
-        QCOMPARE(shownTitle(), QStringLiteral("<i>通知</i> 1 %2"));
-        m_platform.clearFaults();
-        m_window->onReadListMessage("other");
-        QTRY_VERIFY(next()->isEnabled());
     }
 
     void windowMayGoAtAnyTime()
