@@ -372,7 +372,7 @@ private slots:
     {
         m_window.reset();
         NetworkDaemonProxy daemon(zent::dbus::kNetworkService, zent::dbus::kNetworkPath, QDBusConnection::sessionBus());
-        daemon.setTimeout(1200);
+        daemon.setTimeout(3000);
         const QPair<QJsonObject, int> faults[] = {{{{"error", "com.vantor.Error.Failed"}, {"delay_ms", 1100}}, 2},
                                                   {{{"vanish", true}}, 2},
                                                   {{{"hang", true}}, 1}};
