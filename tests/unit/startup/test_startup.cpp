@@ -2,24 +2,45 @@
 #include "fixture.h"
 #include "gates.h"
 #include "idcommand.h"
+#include "instancelock.h"
 #include "log.h"
 #include "signalquit.h"
 
-#include <QCoreApplication>
-#include <QRegularExpression>
-#include <QtTest>
+#include <QProcess>
+#include <QTemporaryDir>
 
 #include <csignal>
 #include <cstdlib>
 #include <cstring>
 #include <ctime>
 #include <sys/resource.h>
+#include <sys/syscall.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
+namespace
+{
+
+/// What the kernel answers instead to so many calls, if anything.
+int refusal = 0;
+int refusals = 0;
+
+} // namespace
+
+extern "C" int flock(int fd, int operation) noexcept
+{
+    if (refusals-- <= 0)
+        return int(::syscall(SYS_flock, fd, operation));
+    errno = refusal;
+    return -1;
+}
+
+/// What decides whether and how the client starts, and what goes on until its end.
 class TestStartup : public QObject
 {
     Q_OBJECT
+
+    using Result = InstanceLock::Result;
 
     const QString m_room = qEnvironmentVariable("ROOM");
 
@@ -78,6 +99,52 @@ private slots:
         }
         testfiles::remove(m_room + "/standin/id.hook");
         QCOMPARE(kill(testfiles::read(m_room + "/id.pid").trimmed().toInt(), 0), -1);
+    }
+
+    void instanceLockGoesWithItsHolder()
+    {
+        const QTemporaryDir directory;
+        const QString key = "zent/../info";
+        InstanceLock later;
+        qint64 child = 0;
+        {
+            InstanceLock holder;
+            QCOMPARE(holder.acquire(directory.path(), key), Result::Acquired);
+            QCOMPARE(holder.acquire(directory.path(), key), Result::Acquired);
+            QCOMPARE(int(QFile::permissions(InstanceLock::filePath(directory.path(), key))), 0x6600);
+            QVERIFY(QProcess::startDetached("sleep", {"60"}, QString(), &child));
+            QCOMPARE(later.acquire(directory.path(), key), Result::Held);
+        }
+        const Result afterwards = later.acquire(directory.path(), key);
+        QVERIFY2(::kill(child, SIGTERM) == 0, "the holder's child must still run for this to prove anything");
+        QCOMPARE(afterwards, Result::Acquired);
+        QCOMPARE(QDir(directory.path()).entryList(QDir::Files).size(), 1);
+    }
+
+    void unusableLockFiles()
+    {
+        const QTemporaryDir directory;
+        const QString target = directory.filePath("target");
+        QVERIFY(QFile::link(target, InstanceLock::filePath(directory.path(), "link")));
+        QVERIFY(QDir().mkdir(InstanceLock::filePath(directory.path(), "folder")));
+        const std::tuple<const char*, int, int, Result, const char*> rows[] = {
+            {"link", ELOOP, 0, Result::Failed, "warning cannot open the lock file %1 : %2"},
+            {"folder", EISDIR, 0, Result::Failed, "warning cannot open the lock file %1 : %2"},
+            {"refused", EIO, 1, Result::Failed, "warning cannot lock %1 : %2"},
+            {"held", EWOULDBLOCK, 1, Result::Held, nullptr},
+            {"interrupted", EINTR, 2, Result::Acquired, nullptr}};
+        const int files = QDir("/proc/self/fd").entryList(QDir::NoDotAndDotDot | QDir::AllEntries).size();
+        for (const auto& [key, error, times, result, line] : rows) {
+            const LogCapture log;
+            refusal = error;
+            refusals = times;
+            const QString path = InstanceLock::filePath(directory.path(), key);
+            QCOMPARE(InstanceLock().acquire(directory.path(), key), result);
+            QCOMPARE(log.records(),
+                     line ? QStringList{QString(line).arg(path, qt_error_string(error))} : QStringList());
+        }
+        QCOMPARE(QDir("/proc/self/fd").entryList(QDir::NoDotAndDotDot | QDir::AllEntries).size(), files);
+        QVERIFY(!QFile::exists(target));
     }
 
     void minorVersion()
