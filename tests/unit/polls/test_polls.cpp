@@ -280,6 +280,10 @@ private slots:
             // An hour that Berlin skips.
             QCOMPARE(zent::formatServerTime("2024-03-31T02:30:00Z", false, QDate()), QString("2024/03/31 10:30"));
         }
+        QElapsedTimer waited;
+        waited.start();
+        QNotification::msleep(250);
+        QVERIFY(waited.elapsed() >= 240);
     }
 };
 
