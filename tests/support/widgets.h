@@ -2,6 +2,7 @@
 #pragma once
 
 #include <QFont>
+#include <QJsonArray>
 #include <QWidget>
 #include <QtTest>
 
@@ -18,4 +19,11 @@ inline QFont font(int pixels)
     QFont font;
     font.setPixelSize(pixels);
     return font;
+}
+
+/// A rectangle of four numbers: left, top, width and height.
+inline QRect rect(const QJsonValue& numbers)
+{
+    const QJsonArray n = numbers.toArray();
+    return {n[0].toInt(), n[1].toInt(), n[2].toInt(), n[3].toInt()};
 }

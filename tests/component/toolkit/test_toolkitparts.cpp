@@ -4,18 +4,57 @@
 #include "toolkitcombobox.h"
 #include "toolkitdialog.h"
 #include "toolkitframe.h"
+#include "toolkitlabel.h"
 #include "toolkitpasswordedit.h"
 #include "toolkitspinner.h"
 #include "toolkitsuggestbutton.h"
 #include "toolkittitlebar.h"
 #include "toolkittoolbutton.h"
 #include "toolkitwarningbutton.h"
+#include "widgets.h"
 
 #include <functional>
 
-/// What the widgets draw in their states, compared with pictures that were looked at. They hold no text, so that no
-/// font matters. A row's picture shows its states from left to right.
-class TestToolkitPictures : public QObject
+namespace
+{
+
+/// What pointing at the widget shows.
+QString toolTip(QWidget& widget)
+{
+    QHelpEvent event(QEvent::ToolTip, QPoint(1, 1), QPoint(1, 1));
+    return QApplication::sendEvent(&widget, &event) && event.isAccepted() ? QToolTip::text() : QString();
+}
+
+class PaintCounter : public QObject
+{
+public:
+    explicit PaintCounter(QObject* watched) : QObject(watched) { watched->installEventFilter(this); }
+    bool eventFilter(QObject*, QEvent* event) override
+    {
+        count += event->type() == QEvent::Paint ? 1 : 0;
+        return false;
+    }
+    int count = 0;
+};
+
+/// Every colour of the palette, by its group and role.
+QJsonObject colours(const QPalette& palette)
+{
+    static const auto kRoles = QMetaEnum::fromType<QPalette::ColorRole>();
+    static const auto kGroups = QMetaEnum::fromType<QPalette::ColorGroup>();
+    QJsonObject colours;
+    for (const auto group : {QPalette::Active, QPalette::Inactive, QPalette::Disabled}) {
+        for (int role = 0; role < QPalette::NColorRoles; ++role)
+            colours[QString(kGroups.valueToKey(group)) + ' ' + kRoles.valueToKey(role)] =
+                palette.color(group, QPalette::ColorRole(role)).name();
+    }
+    return colours;
+}
+
+} // namespace
+
+/// What the widgets of the toolkit are made of and draw, each in the states that the rows of the tables say.
+class TestToolkitParts : public QObject
 {
     Q_OBJECT
 
@@ -30,8 +69,10 @@ class TestToolkitPictures : public QObject
     static QWidget* segments(QWidget* parent)
     {
         auto* box = new ToolkitButtonBox(parent);
-        for (int number = 0; number < 2; ++number)
+        for (const char* name : {"first", "second"}) {
             box->addButton(new ToolkitButtonBoxButton("", box));
+            box->buttonList().constLast()->setObjectName(name);
+        }
         box->buttonList().constFirst()->setChecked(true);
         return box;
     }
@@ -67,6 +108,7 @@ class TestToolkitPictures : public QObject
             {"tool button", [](QWidget* parent) { return new ToolkitToolButton(parent); }},
             {"segments", segments},
             {"segment", [](QWidget* parent) { return new ToolkitButtonBoxButton("", parent); }},
+            {"label", [](QWidget* parent) { return new ToolkitLabel(parent); }},
             {"combo box", [](QWidget* parent) { return new ToolkitComboBox(parent); }},
             {"line edit", [](QWidget* parent) { return new ToolkitLineEdit(parent); }},
             {"password edit", [](QWidget* parent) { return new ToolkitPasswordEdit(parent); }},
@@ -86,55 +128,71 @@ class TestToolkitPictures : public QObject
         return qobject_cast<Widget*>(widget);
     }
 
-    /// Puts the widget into a state; one that it cannot have fails the test.
+    static void loosen(QWidget* box)
+    {
+        as<ToolkitButtonBox>(box)->setButtonList(box->findChildren<QAbstractButton*>("second"), false);
+    }
+
+    /// Puts the widget into a state: "child:word" one of its children, "name=value" by a property, "name()" by a slot,
+    /// "Ctrl+R" by keys, and else as this table says. One that it cannot have fails the test.
     static void apply(QWidget* widget, const QString& word)
     {
         static const std::map<QString, std::function<void(QWidget*)>> kWords{
             {"", [](QWidget*) {}},
-            {"dark", [](QWidget*) {}},
+            {"dark", [](QWidget* one) { one->window()->setPalette(ThemeHelper::palette(ThemeHelper::DarkType)); }},
             {"hovered", [](QWidget* one) { one->setAttribute(Qt::WA_UnderMouse); }},
-            {"disabled", [](QWidget* one) { one->setEnabled(false); }},
-            {"focused", [](QWidget* one) { one->setFocus(); }},
             {"large", [](QWidget* one) { one->resize(180, 40); }},
+            {"fitted", [](QWidget* one) { one->setFixedSize(one->sizeHint()); }},
+            {"14px", [](QWidget* one) { one->setFont(font(14)); }},
             {"shown", [](QWidget* one) { one->window()->show(); }},
             {"gone", [](QWidget* one) { one->window()->hide(); }},
-            {"upright", [](QWidget* one) { as<QFrame>(one)->setFrameShape(QFrame::VLine); }},
-            {"level", [](QWidget* one) { as<QFrame>(one)->setFrameShape(QFrame::HLine); }},
-            {"down", [](QWidget* one) { as<QAbstractButton>(one)->setDown(true); }},
-            {"checked", [](QWidget* one) { as<QAbstractButton>(one)->setChecked(true); }},
             {"icon", [](QWidget* one) { as<QAbstractButton>(one)->setIcon(icon()); }},
             {"tinted", [](QWidget* one) { as<ToolkitToolButton>(one)->setIconTinted(true); }},
+            {"left", [](QWidget* one) { as<ToolkitToolButton>(one)->setTextAlignment(Qt::AlignLeft | Qt::AlignTop); }},
+            {"right", [](QWidget* one) { as<ToolkitToolButton>(one)->setTextAlignment(Qt::AlignRight); }},
+            {"loosened", loosen},
+            {"items",
+             [](QWidget* one) {
+                 as<QComboBox>(one)->addItems({"<b>终</b>", "终端别名终端别名"});
+             }},
+            {"shrunk", [](QWidget* one) { as<ToolkitLabel>(one)->shrinkFontToWidth(); }},
             {"alert", [](QWidget* one) { as<ToolkitLineEdit>(one)->setAlert(true); }},
-            {"typed", [](QWidget* one) { as<ToolkitLineEdit>(one)->setText("secret"); }},
             {"filled", [](QWidget* one) { as<ToolkitPasswordEdit>(one)->setClearIcon(icon()); }},
             {"emptied", [](QWidget* one) { as<ToolkitPasswordEdit>(one)->clear(); }},
             {"eyeless", [](QWidget* one) { as<ToolkitPasswordEdit>(one)->setEchoButtonVisible(false); }},
-            {"Ctrl+R", [](QWidget* one) { QTest::keyClick(one, Qt::Key_R, Qt::ControlModifier); }},
-            {"sought", [](QWidget* one) { one->findChild<QAbstractButton*>("echoButton")->setChecked(true); }},
             {"playing", [](QWidget* one) { as<ToolkitSpinner>(one)->start(); }},
             {"stopped", [](QWidget* one) { as<ToolkitSpinner>(one)->stop(); }},
             {"turned", [](QWidget* one) { QMetaObject::invokeMethod(one->findChild<QTimer*>(), "timeout"); }},
             {"menuless", [](QWidget* one) { as<ToolkitTitlebar>(one)->setMenuVisible(false); }},
             {"transparent", [](QWidget* one) { as<ToolkitTitlebar>(one)->setBackgroundTransparent(true); }},
-            {"closed", [](QWidget* one) { one->findChild<QAbstractButton*>("titlebarCloseButton")->click(); }},
             {"clear", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskAlpha(99); }},
             {"sharp", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setRadius(4); }},
+            {"white", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskColor(Qt::white); }},
             {"night", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskColor(Qt::darkBlue); }},
         };
-        kWords.at(word)(widget);
+        const int colon = word.indexOf(':');
+        const int equals = word.indexOf('=');
+        if (colon > 0)
+            apply(widget->findChild<QWidget*>(word.left(colon)), word.mid(colon + 1));
+        else if (equals > 0)
+            QVERIFY2(widget->setProperty(qPrintable(word.left(equals)), word.mid(equals + 1)), qPrintable(word));
+        else if (word.endsWith("()"))
+            QVERIFY2(QMetaObject::invokeMethod(widget, qPrintable(word.chopped(2))), qPrintable(word));
+        else if (word.startsWith("Ctrl+"))
+            QTest::keySequence(widget, QKeySequence(word));
+        else
+            kWords.at(word)(widget);
     }
 
     /// The widget in the state that the words say, in a light window or a dark one.
     static QImage picture(const QString& kind, const QSize& size, const QStringList& words)
     {
         QWidget window;
-        window.setPalette(
-            ThemeHelper::palette(words.contains("dark") ? ThemeHelper::DarkType : ThemeHelper::LightType));
+        window.setPalette(ThemeHelper::palette(ThemeHelper::LightType));
         window.resize(size);
         const std::unique_ptr<QWidget> widget(make(kind, &window));
         widget->resize(size);
-        window.show();
-        if (!QTest::qWaitForWindowActive(&window))
+        if (!shown(window))
             qFatal("no active window");
         // As after a press of Tab.
         window.setAttribute(Qt::WA_KeyboardFocusChange);
@@ -156,6 +214,7 @@ class TestToolkitPictures : public QObject
     }
 
 private slots:
+    // They hold no text, so that no font matters. A row's picture shows its states from left to right.
     void states_data() { fixture::addRows("pictures.json"); }
     void states()
     {
@@ -175,7 +234,6 @@ private slots:
                  qPrintable("not as in tests/data/" + name + ", but as in " + got));
     }
 
-    // What the toolkit's widgets are made of, before and after something is done to them.
     void parts_data() { fixture::addRows("toolkitparts.json"); }
     void parts()
     {
@@ -183,27 +241,56 @@ private slots:
         QWidget window;
         window.setPalette(ThemeHelper::palette(ThemeHelper::LightType));
         const std::unique_ptr<QWidget> widget(make(row["kind"].toString(), &window));
+        QGuiApplication::clipboard()->clear();
         for (const QJsonValue& word : row["words"].toArray())
             apply(widget.get(), word.toString());
-        description::compare(widget.get(), row["widgets"]);
+        if (row.contains("widgets"))
+            description::compare(widget.get(), row["widgets"]);
+        QCOMPARE(QGuiApplication::clipboard()->text(), row["copied"].toString());
+        QCOMPARE(toolTip(*widget), row["tip"].toString(widget->toolTip()));
+    }
+
+    // The colours at the left edge, in the middle and at the right edge; the text is a block.
+    void inks_data() { fixture::addRows("inks.json"); }
+    void inks()
+    {
+        QFETCH(QJsonObject, row);
+        const QStringList words = row["words"].toVariant().toStringList();
+        const QImage image = picture(row["kind"].toString(), QSize(200, 36), QStringList{"14px", "text=█"} + words);
+        QJsonArray got;
+        for (const int column : {8, 100, 191})
+            got.append(image.pixelColor(column, 18).name());
+        fixture::compare(got, row["colours"]);
     }
 
     void palettes()
     {
         const QJsonObject expected = fixture::read("palettes.json");
-        const auto roles = QMetaEnum::fromType<QPalette::ColorRole>();
-        const auto groups = QMetaEnum::fromType<QPalette::ColorGroup>();
-        for (const auto type : {ThemeHelper::UnknownType, ThemeHelper::LightType, ThemeHelper::DarkType}) {
-            QJsonObject got;
-            for (const auto group : {QPalette::Active, QPalette::Inactive, QPalette::Disabled}) {
-                for (int role = 0; role < QPalette::NColorRoles; ++role)
-                    got[QString(groups.valueToKey(group)) + ' ' + roles.valueToKey(role)] =
-                        ThemeHelper::palette(type).color(group, QPalette::ColorRole(role)).name();
-            }
-            fixture::compare(got, expected[type == ThemeHelper::DarkType ? "dark" : "light"]);
+        for (const auto type : {ThemeHelper::UnknownType, ThemeHelper::LightType})
+            fixture::compare(colours(ThemeHelper::palette(type)), expected["light"]);
+        ToolkitComboBox box;
+        box.setPalette(ThemeHelper::palette(ThemeHelper::DarkType));
+        box.showPopup();
+        for (const QWidget* one : {static_cast<QWidget*>(&box), static_cast<QWidget*>(box.view())})
+            fixture::compare(colours(one->palette()), expected["dark"]);
+    }
+
+    void changesAreDrawn()
+    {
+        const std::pair<const char*, const char*> changes[] = {
+            {"surface", "white"},    {"surface", "clear"},   {"surface", "sharp"},  {"tool button", "tinted"},
+            {"tool button", "left"}, {"line edit", "alert"}, {"spinner", "playing"}};
+        for (const auto& [kind, word] : changes) {
+            QWidget window;
+            QWidget* widget = make(kind, &window);
+            QVERIFY(shown(window));
+            QTest::qWait(0);
+            const PaintCounter counter(widget);
+            apply(widget, word);
+            QTRY_VERIFY2(counter.count > 0, word);
         }
     }
 };
 
-QTEST_MAIN(TestToolkitPictures)
-#include "test_toolkitpictures.moc"
+QTEST_MAIN(TestToolkitParts)
+#include "test_toolkitparts.moc"
