@@ -60,7 +60,7 @@ inline QString looks(const QWidget* widget)
 inline QString text(const QVariant& value)
 {
     if (value.type() == QVariant::Pixmap)
-        return text(value.value<QPixmap>().size());
+        return text(value.value<QPixmap>().size() / value.value<QPixmap>().devicePixelRatio());
     if (value.type() == QVariant::Icon)
         return value.value<QIcon>().isNull() ? "none" : "some";
     if (value.type() == QVariant::Cursor)

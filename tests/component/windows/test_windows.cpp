@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "account.h"
 #include "closeguarddialog.h"
 #include "description.h"
 #include "fixture.h"
@@ -13,10 +12,52 @@
 #include "resumedialog.h"
 #include "sessionhost.h"
 #include "spinerwin.h"
+#include "toolkitapplication.h"
+#include "toolkitlabel.h"
 
 #include <QDBusConnection>
 
-/// The names, texts and sizes of each window's widgets, read from the widgets, and what the windows log when used.
+namespace
+{
+
+/// What of the window's visible controls is cut off, as a text; empty where nothing is.
+QString cutOff(const QWidget& window)
+{
+    QStringList faults;
+    for (const QWidget* widget : window.findChildren<QWidget*>()) {
+        if (widget->window() != &window || !widget->isVisible() || widget->objectName().startsWith("qt_"))
+            continue;
+        const QString text = widget->property("text").toString();
+        const QFontMetrics metrics = widget->fontMetrics();
+        bool fits = true;
+        if (const auto* label = qobject_cast<const ToolkitLabel*>(widget)) {
+            const QRect area = label->contentsRect();
+            const QRect ink = metrics.tightBoundingRect(text).translated(0, label->baseline());
+            fits = label->wordWrap() ? label->heightForWidth(label->width()) <= label->height()
+                                     : ink.top() >= area.top() && ink.bottom() <= area.bottom() &&
+                                           metrics.horizontalAdvance(text) <= area.width();
+        } else if (qobject_cast<const QAbstractButton*>(widget)) {
+            // What its frame or box takes from the text on both sides together.
+            const int around = widget->inherits("QCheckBox") ? 20 : 4;
+            fits = metrics.size(Qt::TextShowMnemonic, text).width() + around <= widget->width() &&
+                   metrics.tightBoundingRect(text).height() <= widget->height();
+        } else if (const auto* edit = qobject_cast<const QLineEdit*>(widget)) {
+            const int room = edit->width() - edit->textMargins().left() - edit->textMargins().right();
+            fits = metrics.horizontalAdvance(edit->placeholderText()) <= room;
+        } else {
+            continue;
+        }
+        // Nothing of a control lies outside its parents; labels may be empty.
+        if (!fits || widget->visibleRegion().boundingRect() != widget->rect())
+            faults += QString("%1 \"%2\"%3").arg(widget->metaObject()->className(), text, fits ? " partly hidden" : "");
+    }
+    return faults.join(", ");
+}
+
+} // namespace
+
+/// The names, texts and sizes of each window's widgets, read from the widgets, and what the windows log when used. The
+/// environment says at which scale.
 class TestWindows : public QObject
 {
     Q_OBJECT
@@ -30,14 +71,23 @@ class TestWindows : public QObject
         }
         if (name == "main window")
             return new MainWindow(nullptr, 1020);
-        if (name == "icon button")
-            return new IconButton(nullptr);
+        if (name == "icon button") {
+            auto* button = new IconButton(nullptr);
+            button->setFixedSize(button->minimumSizeHint());
+            return button;
+        }
         if (name == "password")
             return new ModifyDialog;
-        if (name == "message")
-            return new NoticeDialog("zhangsan", nullptr);
-        if (name == "verification")
-            return new resumeDialog;
+        if (name == "message") {
+            auto* message = new NoticeDialog("zhangsan", nullptr);
+            message->nextButton()->setText("下一条(...)");
+            return message;
+        }
+        if (name == "verification") {
+            auto* dialog = new resumeDialog;
+            dialog->setRepairTitle("关键文件被修改：/usr/bin/login");
+            return dialog;
+        }
         if (name == "release")
             return new closeGuarddialog;
         auto* progress = new spinerWin;
@@ -46,29 +96,15 @@ class TestWindows : public QObject
         return progress;
     }
 
-    static void useAccount()
-    {
-        Account account;
-        qInfo() << account.getUserName() << account.isAdminUser() << account.isScenceUser();
-        for (const char* text : {R"({"code": 0, "data": {"user": {"id": 7, "gecos": "A,b,c,1", "client_name": "PC"}}})",
-                                 R"({"code": 0, "data": [{"name": "O"}]})", R"({"code": 1})", "{"}) {
-            QByteArray body = text;
-            account.analyseData(&body);
-            account.analyseAreaData(&body);
-        }
-        account.onUserInfo(404, "{");
-        account.onCompanyName(404, "{");
-    }
-
     static void useWindow(int version)
     {
         MainWindow window(nullptr, version);
         window.onActivatedSysTrayIcon(QSystemTrayIcon::Trigger);
         qInfo() << window.windowFlags() << window.size() << window.windowTitle() << window.windowIcon().isNull();
         window.close();
+        window.onUserInfo(404, "{");
+        window.onCompanyName(404, "{");
         window.readScriptsFile("/none");
-        QByteArray refusal = R"({"code": 1})";
-        window.analyseEvnData(&refusal);
         window.callloadpolicy(2, "code");
         QByteArray scenes = R"({"code": 0, "message": [{"scene_name": "A", "scene_code": "a"},
                                                         {"scene_name": "B", "scene_code": "b"}]})";
@@ -118,6 +154,7 @@ private slots:
     {
         QNotification::qInstance = new QNotification;
         testfiles::remove(testfiles::kMachineFile);
+        QCOMPARE(qApp->devicePixelRatio(), qEnvironmentVariable("QT_SCALE_FACTOR", "1").toDouble());
     }
 
     void widgets_data() { fixture::addRows("windows.json"); }
@@ -126,14 +163,20 @@ private slots:
         QFETCH(QJsonObject, row);
         const std::unique_ptr<QWidget> window(make(QTest::currentDataTag()));
         description::compare(window.get(), row["widgets"]);
+        window->show();
+        for (const char* page : {"LoginInfo", "NetInfo"}) {
+            if (auto* link = window->findChild<QAbstractButton*>(page))
+                link->click();
+            QTest::qWait(0);
+            QCOMPARE(cutOff(*window), QString());
+        }
     }
 
     void logLines_data() { fixture::addRows("windowlogs.json"); }
     void logLines()
     {
         QFETCH(QJsonObject, row);
-        const std::map<QString, std::function<void()>> uses{{"account", useAccount},
-                                                            {"window", [] { useWindow(1020); }},
+        const std::map<QString, std::function<void()>> uses{{"window", [] { useWindow(1020); }},
                                                             {"newer window", [] { useWindow(1030); }},
                                                             {"dialogs", useDialogs},
                                                             {"session", useSession}};
@@ -143,5 +186,12 @@ private slots:
     }
 };
 
-QTEST_MAIN(TestWindows)
+int main(int argc, char** argv)
+{
+    ToolkitApplication::loadPlatformPlugin();
+    ToolkitApplication application(argc, argv);
+    TestWindows test;
+    return QTest::qExec(&test, argc, argv);
+}
+
 #include "test_windows.moc"
