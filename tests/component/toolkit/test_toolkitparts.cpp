@@ -112,6 +112,8 @@ class TestToolkitParts : public QObject
         return qobject_cast<Widget*>(widget);
     }
 
+    static QSize textSize(const QWidget* widget) { return widget->fontMetrics().size(0, "█"); }
+
     static void loosen(QWidget* box)
     {
         as<ToolkitButtonBox>(box)->setButtonList(box->findChildren<QAbstractButton*>("second"), false);
@@ -124,6 +126,12 @@ class TestToolkitParts : public QObject
         {"hovered", [](QWidget* one) { one->setAttribute(Qt::WA_UnderMouse); }},
         {"large", [](QWidget* one) { one->resize(180, 40); }},
         {"fitted", [](QWidget* one) { one->setFixedSize(one->sizeHint()); }},
+        {"padded", [](QWidget* one) { one->setFixedSize(one->sizeHint() - textSize(one)); }},
+        {"least",
+         [](QWidget* one) {
+             one->setFixedSize(QSize(9, 0) + one->minimumSizeHint() - QSize(0, textSize(one).height()));
+         }},
+        {"100px", [](QWidget* one) { one->setFont(font(100)); }},
         {"14px", [](QWidget* one) { one->setFont(font(14)); }},
         {"shown", [](QWidget* one) { QVERIFY(shown(*one->window())); }},
         {"gone", [](QWidget* one) { one->window()->hide(); }},
@@ -146,6 +154,10 @@ class TestToolkitParts : public QObject
         {"transparent", [](QWidget* one) { as<ToolkitTitlebar>(one)->setBackgroundTransparent(true); }},
         {"clear", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskAlpha(99); }},
         {"sharp", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setRadius(4); }},
+        {"clearest", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskAlpha(-1); }},
+        {"opaque", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskAlpha(300); }},
+        {"grey", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskColor(QColor(127, 127, 127)); }},
+        {"lighter grey", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskColor(QColor(128, 128, 128)); }},
         {"white", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskColor(Qt::white); }},
         {"night", [](QWidget* one) { as<ToolkitBlurFrame>(one)->setMaskColor(Qt::darkBlue); }},
     };

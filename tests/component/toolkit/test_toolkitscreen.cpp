@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "boxcloser.h"
 #include "compositor.h"
-#include "fixture.h"
+#include "description.h"
 #include "instancelock.h"
 #include "portal.h"
 #include "queuedinput.h"
@@ -9,13 +9,9 @@
 #include "toolkitapplication.h"
 #include "toolkitblurframe.h"
 #include "toolkitpasswordedit.h"
+#include "widgets.h"
 
-#include <QAbstractButton>
-#include <QClipboard>
-#include <QLabel>
-#include <QLayout>
 #include <QProcess>
-#include <QScreen>
 
 #include <unistd.h>
 #include <xcb/shape.h>
@@ -23,26 +19,16 @@
 namespace
 {
 
-/// What the server has as the window's shape: the pixels that are missing at the left of each row, until none are.
-QList<int> insets(const QWidget& window, int& rows)
+/// What the server has as the window's shape, in bands from the top.
+QStringList shape(const QWidget& window)
 {
     const auto cookie = xcb_shape_get_rectangles(QX11Info::connection(), window.winId(), XCB_SHAPE_SK_BOUNDING);
     const auto reply = xwindows::owned(xcb_shape_get_rectangles_reply(QX11Info::connection(), cookie, nullptr));
-    QRegion region;
-    const xcb_rectangle_t* rectangles = xcb_shape_get_rectangles_rectangles(reply.get());
+    const xcb_rectangle_t* bands = xcb_shape_get_rectangles_rectangles(reply.get());
+    QStringList shape;
     for (int i = 0; i < xcb_shape_get_rectangles_rectangles_length(reply.get()); ++i)
-        region += QRect(rectangles[i].x, rectangles[i].y, rectangles[i].width, rectangles[i].height);
-    rows = region.boundingRect().height();
-    QList<int> insets;
-    for (int y = 0; y < rows; ++y) {
-        const QRect row = (region & QRect(0, y, 10000, 1)).boundingRect();
-        const QRect mirrored = (region & QRect(0, rows - 1 - y, 10000, 1)).boundingRect();
-        if (row.left() == 0)
-            break;
-        const bool even = row.right() == window.width() - 1 - row.left() && mirrored.left() == row.left();
-        insets.append(even ? row.left() : -1);
-    }
-    return insets;
+        shape += QString("%1,%2 %3x%4").arg(bands[i].x).arg(bands[i].y).arg(bands[i].width).arg(bands[i].height);
+    return shape;
 }
 
 /// The rectangles behind the window that are to be blurred.
@@ -58,27 +44,6 @@ class TestToolkitScreen : public QObject
 {
     Q_OBJECT
 
-    /// Where a box lies: in the middle of its window, and at which edges of the screen.
-    static QString place(const QRect& box, const QRect& window)
-    {
-        const QRect screen = QGuiApplication::primaryScreen()->availableGeometry();
-        QStringList words;
-        const QPoint off = box.center() - window.center();
-        if (std::abs(off.x()) <= 1)
-            words.append("centred");
-        if (std::abs(off.y()) <= 1)
-            words.append("level");
-        const std::pair<bool, const char*> edges[] = {{box.left() == screen.left(), "left"},
-                                                      {box.top() == screen.top(), "top"},
-                                                      {box.right() == screen.right(), "right"},
-                                                      {box.bottom() == screen.bottom(), "bottom"}};
-        for (const auto& [touches, edge] : edges) {
-            if (touches)
-                words.append(edge);
-        }
-        return words.join(' ');
-    }
-
 private slots:
     // The first, since the program asks the portal once.
     void themeFollowsThePortal()
@@ -88,39 +53,36 @@ private slots:
         QVERIFY(bus.registerService("org.freedesktop.portal.Desktop"));
         bus.registerObject("/org/freedesktop/portal/desktop", &portal, QDBusConnection::ExportAllSlots);
         const QSignalSpy changed(ThemeHelper::instance(), &ThemeHelper::themeTypeChanged);
+        const ToolkitDialog dialog;
         QTRY_COMPARE(changed.count(), 1);
         QCOMPARE(portal.asked, "org.freedesktop.appearance color-scheme");
         QTRY_VERIFY(ThemeHelper::instance()->children().isEmpty());
-        QCOMPARE(ThemeHelper::instance()->themeType(), ThemeHelper::DarkType);
-        const ToolkitDialog dialog;
-        const auto surface = [&dialog] { return dialog.palette().color(QPalette::Window).lightness(); };
-        QVERIFY(surface() < 50);
-        Portal::change("org.freedesktop.appearance", "contrast", 2U);
-        Portal::change("org.other", "color-scheme", 2U);
-        Portal::change("org.freedesktop.appearance", "color-scheme", 1U);
-        Portal::change("org.freedesktop.appearance", "color-scheme", 2U);
-        QTRY_COMPARE(changed.count(), 2);
-        QCOMPARE(changed.last().constFirst().value<ThemeHelper::ColorType>(), ThemeHelper::LightType);
-        QVERIFY(surface() > 200);
-        // Without a preference the palette decides.
-        Portal::change("org.freedesktop.appearance", "color-scheme", 1U);
-        Portal::change("org.freedesktop.appearance", "color-scheme", 0U);
-        QTRY_COMPARE(changed.count(), 4);
-        QCOMPARE(ThemeHelper::instance()->themeType(), ThemeHelper::LightType);
+        const char* const kAppearance = "org.freedesktop.appearance";
         const QPalette before = QApplication::palette();
-        for (const auto& [lightness, type] : {std::pair{127, ThemeHelper::DarkType}, {128, ThemeHelper::LightType}}) {
+        // A setting that changes or, without a name, the lightness of the palette, which decides without a preference.
+        const std::tuple<const char*, const char*, int, ThemeHelper::ColorType> changes[] = {
+            {kAppearance, "contrast", 2, ThemeHelper::DarkType},
+            {"org.other", "color-scheme", 2, ThemeHelper::DarkType},
+            {kAppearance, "color-scheme", 1, ThemeHelper::DarkType},
+            {kAppearance, "color-scheme", 2, ThemeHelper::LightType},
+            {kAppearance, "color-scheme", 1, ThemeHelper::DarkType},
+            {kAppearance, "color-scheme", 0, ThemeHelper::LightType},
+            {nullptr, nullptr, 127, ThemeHelper::DarkType},
+            {nullptr, nullptr, 128, ThemeHelper::LightType},
+            {nullptr, nullptr, 0, ThemeHelper::DarkType},
+            {kAppearance, "color-scheme", 2, ThemeHelper::LightType}};
+        for (const auto& [nameSpace, key, value, type] : changes) {
             QPalette palette = before;
-            palette.setColor(QPalette::Window, QColor(lightness, lightness, lightness));
-            QApplication::setPalette(palette);
+            palette.setColor(QPalette::Window, QColor(value, value, value));
+            if (key)
+                Portal::change(nameSpace, key, uint(value));
+            else
+                QApplication::setPalette(palette);
             QTRY_COMPARE(ThemeHelper::instance()->themeType(), type);
+            QCOMPARE(changed.last().constFirst().value<ThemeHelper::ColorType>(), type);
+            QCOMPARE(dialog.palette(), ThemeHelper::palette(type));
         }
-        // A preference beats a dark palette.
-        QPalette dark = before;
-        dark.setColor(QPalette::Window, Qt::black);
-        QApplication::setPalette(dark);
-        QTRY_COMPARE(ThemeHelper::instance()->themeType(), ThemeHelper::DarkType);
-        Portal::change("org.freedesktop.appearance", "color-scheme", 2U);
-        QTRY_COMPARE(ThemeHelper::instance()->themeType(), ThemeHelper::LightType);
+        QCOMPARE(changed.count(), 8);
         QApplication::setPalette(before);
     }
 
@@ -128,22 +90,22 @@ private slots:
     {
         ToolkitBlurFrame frame;
         frame.resize(200, 100);
-        frame.show();
-        QVERIFY(QTest::qWaitForWindowActive(&frame));
-        int rows = 0;
-        QCOMPARE(insets(frame, rows), (QList<int>{9, 6, 5, 4, 3, 2, 1, 1, 1}));
-        QCOMPARE(rows, 100);
+        QVERIFY(shown(frame));
+        const QStringList round{"9,0 182x1", "6,1 188x1", "5,2 190x1", "4,3 192x1",
+                                "3,4 194x1", "2,5 196x1", "1,6 198x3", "0,9 200x82"};
+        QCOMPARE(shape(frame).mid(0, 8), round);
         frame.setRadius(4);
-        QCOMPARE(insets(frame, rows), (QList<int>{2, 1}));
+        QCOMPARE(shape(frame), (QStringList{"2,0 196x1", "1,1 198x1", "0,2 200x96", "1,98 198x1", "2,99 196x1"}));
         frame.resize(120, 60);
-        QTRY_VERIFY(insets(frame, rows) == (QList<int>{2, 1}) && rows == 60);
+        const QStringList smaller{"2,0 116x1", "1,1 118x1", "0,2 120x56", "1,58 118x1", "2,59 116x1"};
+        QTRY_COMPARE(shape(frame), smaller);
         frame.setRadius(-1);
         QCOMPARE(frame.radius(), 0);
         // New flags make a new native window.
         frame.setRadius(4);
         frame.setWindowFlags(frame.windowFlags() | Qt::Tool);
         frame.show();
-        QCOMPARE(insets(frame, rows), (QList<int>{2, 1}));
+        QCOMPARE(shape(frame), smaller);
         QWidget parent;
         const ToolkitBlurFrame panel(&parent);
         QVERIFY(!panel.isWindow() && frame.windowFlags().testFlag(Qt::FramelessWindowHint));
@@ -153,19 +115,22 @@ private slots:
     {
         ToolkitBlurFrame frame;
         frame.resize(200, 100);
-        frame.show();
-        QVERIFY(QTest::qWaitForWindowActive(&frame));
+        QVERIFY(shown(frame));
         const auto corner = [&frame] { return frame.grab().toImage().pixelColor(0, 0).alpha(); };
-        int rows = 0;
         QCOMPARE(blurred(frame), QVector<quint32>());
         QCOMPARE(corner(), 255);
         {
             const Compositor compositor;
             frame.update();
-            QTRY_VERIFY(insets(frame, rows).isEmpty());
+            QTRY_COMPARE(shape(frame), QStringList{"0,0 200x100"});
             QVERIFY(corner() < 20);
             const QVector<quint32> region = blurred(frame);
             QCOMPARE(region.mid(0, 4), (QVector<quint32>{9, 0, 182, 1}));
+            // Drawing alone asks for nothing again.
+            xwindows::setProperty(frame.winId(), kBlurProperty, {7});
+            frame.repaint();
+            QCoreApplication::sendPostedEvents();
+            QCOMPARE(blurred(frame), QVector<quint32>{7});
             frame.setMaskAlpha(255);
             QCOMPARE(blurred(frame), QVector<quint32>());
             frame.setMaskAlpha(254);
@@ -176,7 +141,7 @@ private slots:
             QCOMPARE(blurred(dialog), QVector<quint32>());
         }
         frame.update();
-        QTRY_COMPARE(insets(frame, rows).size(), 9);
+        QTRY_COMPARE(shape(frame).size(), 15);
     }
 
     void boxesLieOverTheirWindow_data() { fixture::addRows("boxes.json"); }
@@ -184,33 +149,29 @@ private slots:
     {
         QFETCH(QJsonObject, row);
         QWidget window(nullptr, Qt::FramelessWindowHint | Qt::X11BypassWindowManagerHint);
-        const QList<QVariant> sides = row["window"].toArray().toVariantList();
-        window.setGeometry(sides[0].toInt(), sides[1].toInt(), sides[2].toInt(), sides[3].toInt());
+        window.setGeometry(rect(row["window"]));
         window.show();
         QVERIFY(QTest::qWaitForWindowExposed(&window));
         BoxCloser closer;
-        QJsonObject got;
-        closer.instead = [&got, &window, &row] {
+        closer.instead = [&window, &row] {
             auto* box = qobject_cast<ToolkitDialog*>(QApplication::activeModalWidget());
-            got["place"] = place(box->geometry(), window.geometry());
+            description::compare(box, row["widgets"]);
+            const QRect got = box->geometry();
+            const QRect screen = box->screen()->availableGeometry();
+            // Its left edge; whether it is level with its window, and whether it touches the edges of the screen.
+            const bool level = std::abs((got.center() - window.geometry().center()).y()) <= 1;
+            fixture::compare(QJsonArray{got.left(), level, got.top() == screen.top(), got.bottom() == screen.bottom()},
+                             row["place"]);
             const QImage sign = box->windowIcon().pixmap(64).toImage();
             const QImage picture(QString(ZENT_TEST_DATA "/pictures/") + row["sign"].toString());
-            if (sign != picture.convertToFormat(sign.format()) &&
-                sign.save(qEnvironmentVariable("ROOM") + "/" + row["sign"].toString()))
-                got["sign"] = "another";
-            QStringList buttons;
-            for (const QAbstractButton* button : box->buttons())
-                buttons.append(QString(button->metaObject()->className()) + ' ' + button->text() +
-                               (button->property("default").toBool() ? " default" : ""));
-            got["buttons"] = QJsonArray::fromStringList(buttons);
-            got["below"] = box->layout()->contentsMargins().bottom();
+            const QString other = qEnvironmentVariable("ROOM") + "/" + row["sign"].toString();
+            QVERIFY2(sign == picture.convertToFormat(sign.format()) || !sign.save(other), qPrintable(other));
             box->close();
         };
         const auto kind = QMetaEnum::fromType<ToolkitDialog::BoxKind>().keyToValue(qPrintable(row["kind"].toString()));
         ToolkitDialog::tell(&window, row["text"].toString(), row["title"].toString(), ToolkitDialog::BoxKind(kind));
         fixture::compare(closer.texts.constFirst(), row["title"].toString() + row["text"].toString());
         QVERIFY(window.findChildren<ToolkitDialog*>().isEmpty());
-        fixture::compare(got, row["box"]);
     }
 
     void dialogGivesTheKeyboardBack_data() { fixture::addRows("keyboard.json"); }
@@ -242,8 +203,7 @@ private slots:
         ToolkitPasswordEdit edit(&window);
         QLineEdit other(&window);
         edit.resize(200, 36);
-        window.show();
-        QVERIFY(QTest::qWaitForWindowActive(&window));
+        QVERIFY(shown(window));
         edit.setFocus();
         const auto* sign = edit.findChild<QWidget*>("capsLockSign");
         const auto pressed = [] { return QProcess::execute("xdotool", {"key", "Caps_Lock"}) == 0; };
@@ -269,24 +229,19 @@ private slots:
     void inputThatWaitedIsDropped()
     {
         QLineEdit edit;
-        const auto type = [&edit](char letter, quint32 time, bool spontaneous) {
+        queuedinput::discard();
+        const auto now = quint32(QX11Info::getTimestamp());
+        // What comes after the waiting is over ends the dropping.
+        const std::tuple<char, quint32, bool> keys[] = {
+            {'a', now - 1000, true}, {'b', 0, false},       {'c', now - 0x7fffff00, true}, {'d', now + 10, false},
+            {'e', now - 1000, true}, {'f', now + 10, true}, {'g', now - 1000, true}};
+        for (const auto& [letter, time, spontaneous] : keys) {
             QKeyEvent event(QEvent::KeyPress, 0, Qt::NoModifier, QString(letter));
             event.setTimestamp(time);
             if (spontaneous)
                 QSpontaneKeyEvent::setSpontaneous(&event);
             qApp->notify(&edit, &event);
-        };
-        queuedinput::discard();
-        const auto now = quint32(QX11Info::getTimestamp());
-        type('a', now - 1000, true);
-        type('b', 0, false);
-        type('c', now - 0x7fffff00, true);
-        type('d', now + 10, false);
-        type('e', now - 1000, true);
-        QCOMPARE(edit.text(), "bd");
-        // What comes after the waiting is over ends the dropping.
-        type('f', now + 10, true);
-        type('g', now - 1000, true);
+        }
         QCOMPARE(edit.text(), "bdfg");
         queuedinput::discard();
         QTest::mouseClick(&edit, Qt::LeftButton);
