@@ -267,10 +267,12 @@ private slots:
         const QJsonObject expected = fixture::read("palettes.json");
         for (const auto type : {ThemeHelper::UnknownType, ThemeHelper::LightType})
             fixture::compare(colours(ThemeHelper::palette(type)), expected["light"]);
-        ToolkitComboBox box;
-        box.setPalette(ThemeHelper::palette(ThemeHelper::DarkType));
+        // The list of a combo box is a window of its own.
+        QWidget window;
+        window.setPalette(ThemeHelper::palette(ThemeHelper::DarkType));
+        ToolkitComboBox box(&window);
         box.showPopup();
-        for (const QWidget* one : {static_cast<QWidget*>(&box), static_cast<QWidget*>(box.view())})
+        for (const QWidget* one : {&window, static_cast<QWidget*>(box.view())})
             fixture::compare(colours(one->palette()), expected["dark"]);
     }
 };
