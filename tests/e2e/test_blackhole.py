@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
-"""How fast the panel is while the management server does not answer at all, measured on the screen, and how soon the client
-ends while a name server does not."""
+"""How fast the panel is while the management server does not answer at all, measured on the screen, and how
+soon the client ends while a name server does not."""
 
 import json
 import os

@@ -1,5 +1,5 @@
 # SPDX-License-Identifier: Apache-2.0
-"""The whole client: its start and end, its objects on the session bus, its children, its window, and impatient users."""
+"""The whole client: start and end, its objects on the session bus, children, its window, and impatient users."""
 
 import os
 import signal
