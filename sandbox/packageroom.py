@@ -1,8 +1,11 @@
 # SPDX-License-Identifier: Apache-2.0
-"""What the tests of the built package share: a room that dpkg may write to.
+"""What the tests of the built package share: a room that dpkg and apt may write to.
+
+    packageroom.py [--control-group] TEST...     runs modules of tests/package in such a room
 
 In the room the user is root of a namespace of his own (unshare -r) and installs with the machine's dpkg: dependencies
-and triggers are those of real packages.
+and triggers are those of real packages. With --control-group the room has a control group of its own, below one that
+this user may divide: systemd gives such a one to every session, and .ci/run to the tests.
 """
 
 import contextlib
@@ -15,6 +18,7 @@ import sys
 TREE = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 NAME = "zentw-info"
 DATABASE = "/var/lib/dpkg"
+APT = ("/srv", "/etc/apt", "/etc/apt/keyrings", "/etc/apt/sources.list.d")
 INSIDE = "ROOM" in os.environ
 
 
@@ -23,15 +27,17 @@ def built_package():
     return package
 
 
-def room_command(package, command, writable=()):
+def room_command(package, command):
     """The command that runs another one in a room in which this package can be installed."""
     listing = subprocess.run(["dpkg-deb", "--contents", package], capture_output=True, text=True, check=True).stdout
     shipped = [line.split(maxsplit=5)[5][1:].rstrip("/") for line in listing.splitlines() if line.startswith("d")]
     shared = [path for path in shipped if path not in ("", "/usr") and os.path.isdir(path)]
-    system = [DATABASE, f"{DATABASE}/info", f"{DATABASE}/triggers", f"{DATABASE}/updates"]
+    system = [DATABASE, f"{DATABASE}/info", f"{DATABASE}/triggers", f"{DATABASE}/updates",
+              *filter(os.path.isdir, APT)]
     result = [f"{TREE}/sandbox/enter", "--platform", "--env", f"CLIENT=/usr/bin/{NAME}",
-              "--env", f"PACKAGE={package}", "--env", "WRITABLE=" + ":".join(shared)]
-    for path in [*shared, *system, *writable]:
+              "--env", f"PACKAGE={package}", "--env", "WRITABLE=" + ":".join(shared),
+              "--env", f"PYTHONPATH={TREE}/sandbox:{TREE}/tests/package"]
+    for path in [*shared, *system]:
         result += ["--writable", path]
     return [*result, *command]
 
@@ -72,8 +78,8 @@ def new_control_group():
     return path
 
 
-def run_in_control_group():
-    """Runs the calling test program in a room that has a control group; returns its exit status."""
+def run_in_control_group(command):
+    """Runs a command in a control group of its own; returns its exit status."""
     group = new_control_group()
     if not group:
         print("skipped: no control group of this user's own")
@@ -83,7 +89,18 @@ def run_in_control_group():
         with open(f"{group}/cgroup.procs", "w", encoding="ascii") as processes:
             processes.write("0")
     try:
-        return subprocess.run(room_command(built_package(), this_test()), preexec_fn=move_there, check=False).returncode
+        return subprocess.run(command, preexec_fn=move_there, check=False).returncode
     finally:
         for path, _, _ in os.walk(group, topdown=False):
             os.rmdir(path)
+
+
+def main(arguments):
+    grouped = arguments[:1] == ["--control-group"]
+    tests = ["/usr/bin/python3", "-B", "-m", "unittest", "-v", *arguments[grouped:]]
+    command = room_command(built_package(), tests)
+    return run_in_control_group(command) if grouped else subprocess.run(command, check=False).returncode
+
+
+if __name__ == "__main__":
+    sys.exit(main(sys.argv[1:]))

@@ -1,27 +1,30 @@
-#!/usr/bin/python3
 # SPDX-License-Identifier: Apache-2.0
-"""The built package from installation to purge: run outside, this file runs itself in a room that dpkg may write to."""
+"""The built package from a signed archive to purge, by the commands of docs/rollout.md, word by word."""
 
 import configparser
 import glob
 import os
+import re
 import shlex
 import shutil
 import subprocess
-import sys
 
-sys.path.insert(0, os.path.join(os.path.dirname(os.path.abspath(__file__)), "../../sandbox"))
-
-from packageroom import (  # noqa: E402
-    DATABASE, INSIDE, NAME, built_package, dpkg, room_command, take_database, this_test)
-
-if not INSIDE:
-    command = room_command(built_package(), this_test())
-    os.execv(command[0], command)
-
-from clienttest import ClientTest, read, roomclient, stop, unittest, write  # noqa: E402
+from clienttest import TREE, ClientTest, roomclient, stop, write
+from packageroom import DATABASE, NAME, dpkg, take_database
 
 AUTOSTART = f"/etc/xdg/autostart/{NAME}.desktop"
+WORK = "/tmp/rollout"
+# The room has no network and a single user: only the archive is asked, and nobody else's rights are taken.
+CONFIGURATION = f"""APT::Sandbox::User "root";
+Dir::Etc::SourceList "/etc/apt/sources.list.d/zent.list";
+Dir::Etc::SourceParts "/dev/null";
+Dir::State::Lists "{WORK}/lists/";
+Dir::State::extended_states "{WORK}/extended_states";
+Dir::Cache "{WORK}/cache/";
+Dir::Log "{WORK}";
+DPkg::Pre-Install-Pkgs {{}};
+DPkg::Options {{ "--log={WORK}/dpkg.log"; }};
+"""
 
 
 def entries():
@@ -29,55 +32,97 @@ def entries():
     return {f"{path}/{name}" for path in os.environ["WRITABLE"].split(":") for name in os.listdir(path)}
 
 
-def installed_schemas():
-    env = {name: value for name, value in os.environ.items() if name != "GSETTINGS_SCHEMA_DIR"}
-    return subprocess.run(["gsettings", "list-schemas"], env=env, capture_output=True, text=True,
-                          check=True).stdout.split()
+def section(heading):
+    with open(f"{TREE}/docs/rollout.md", encoding="utf-8") as document:
+        return document.read().split(f"\n## {heading}\n")[1].split("\n## ")[0]
 
 
-def session_command(path):
-    """The command by which a session starts an autostart entry; None where it would pass the entry over."""
+def commands(heading, paragraph=0):
+    """The lines of one block of commands below a heading of the document."""
+    return re.findall(r"(?:^    .*\n)+", section(heading), re.MULTILINE)[paragraph].replace("\n    ", "\n").strip()
+
+
+def session_command():
+    """The command by which a session starts the autostart entry; None where it would pass the entry over."""
     parser = configparser.ConfigParser(interpolation=None, delimiters=("=",))
     parser.optionxform = str
-    parser.read(path, encoding="utf-8")
+    parser.read(AUTOSTART, encoding="utf-8")
     entry = parser["Desktop Entry"]
-    if entry.get("Hidden") == "true" or not shutil.which(entry["TryExec"]):
-        return None
-    return shlex.split(entry["Exec"])
+    return shlex.split(entry["Exec"]) if entry.get("Hidden") != "true" and shutil.which(entry["TryExec"]) else None
 
 
 class Package(ClientTest):
-    def start_as_session(self):
-        return self.desktop.spawn(session_command(AUTOSTART))
+    def run_lines(self, lines, place=WORK, succeeds=True):
+        """Runs commands as the root of a user namespace; returns their output."""
+        result = subprocess.run(["unshare", "-r", "bash", "-euc", lines], cwd=place, check=False, text=True,
+                                stdout=subprocess.PIPE, stderr=subprocess.STDOUT)
+        self.assertEqual(result.returncode == 0, succeeds, result.stdout)
+        return result.stdout
 
-    def test_from_installation_to_purge(self):
+    def installed(self):
+        return self.run_lines(f"dpkg-query -W -f '${{Version}}' {NAME}")
+
+    def has_schema(self):
+        return "com.vantor.zent.lockdown" in self.run_lines("env -u GSETTINGS_SCHEMA_DIR gsettings list-schemas")
+
+    def prepare(self):
         take_database()
+        for directory in ("lists/partial", "cache/archives/partial", "gnupg"):
+            os.makedirs(f"{WORK}/{directory}", mode=0o700)
+        write(f"{WORK}/apt.conf", CONFIGURATION.encode())
+        os.environ.update(APT_CONFIG=f"{WORK}/apt.conf", GNUPGHOME=f"{WORK}/gnupg", DEBIAN_FRONTEND="noninteractive",
+                          LC_ALL="C.UTF-8")
+        shutil.copy(os.environ["PACKAGE"], WORK)
+
+    def publish_next(self, again):
+        """The package once more, with a later version, in the archive."""
+        self.run_lines(f"dpkg-deb -R {os.environ['PACKAGE']} next\n"
+                       "sed -i 's/^Version: .*/&+next/' next/DEBIAN/control\n"
+                       f"dpkg-deb --root-owner-group -b next /srv/zent/pool/{NAME}_next.deb")
+        self.run_lines("\n".join(again), "/srv/zent")
+
+    def test_from_archive_to_purge(self):
+        self.prepare()
         before = entries()
-        self.assertNotIn("com.vantor.zent.lockdown", installed_schemas())
-        dpkg("-i", os.environ["PACKAGE"])
-        self.assertIn("com.vantor.zent.lockdown", installed_schemas())
+        self.assertFalse(self.has_schema())
+        archive = commands("A signed package archive")
+        self.run_lines(archive)
+        shutil.copy("/srv/zent/zent-archive.gpg", WORK)
+        terminal = commands("A signed package archive", 1)
+        self.run_lines(terminal.replace("https://archive.example/zent", "file:/srv/zent"))
+        version = self.installed()
+        self.assertTrue(self.has_schema())
+        self.assertIn("/zh_CN/", self.run_lines(f"man -L zh_CN -w {NAME}"))
+        self.check_sessions()
 
-        self.assertEqual(shutil.which(NAME), f"/usr/bin/{NAME}")
-        client = self.start_as_session()
-        roomclient.wait_syslog("renewCurrentScene")
-        self.desktop.wait("the tray icon", self.desktop.icon)
-        self.assertEqual(stop(client), 0)
+        self.publish_next(archive.splitlines()[-3:])
+        self.run_lines(f"apt-get update\napt-get install -y {NAME}")
+        self.assertEqual(self.installed(), version + "+next")
+        self.run_lines(commands("Going back a version").replace("=0.1.0", "=" + version))
+        self.assertEqual(self.installed(), version)
+        self.assertNotIn(f"Inst {NAME}", self.run_lines("apt-get -s upgrade"))
+        # What nobody has signed is not taken.
+        self.run_lines("echo >> Packages", "/srv/zent")
+        self.run_lines("rm -r lists; mkdir -p lists/partial; apt-get update", succeeds=False)
 
-        # A terminal that is not managed: the session's start ends at once and says nothing to the user.
-        info = read("/etc/zent/userinfo.json")
-        write("/etc/zent/userinfo.json", b"{}")
-        self.assertEqual(self.start_as_session().wait(20), 0)
-        write("/etc/zent/userinfo.json", info)
-
+        self.run_lines(f"apt-mark unhold {NAME}")
         dpkg("--remove", NAME)
         self.assertTrue(os.path.exists(AUTOSTART))
-        self.assertIsNone(session_command(AUTOSTART))
+        self.assertIsNone(session_command())
         dpkg("--purge", NAME)
         self.assertEqual(entries() ^ before, set())
         self.assertEqual(glob.glob(f"{DATABASE}/info/{NAME}.*"), [])
-        self.assertNotIn("com.vantor.zent.lockdown", installed_schemas())
+        self.assertFalse(self.has_schema())
         self.assertTrue(os.path.exists(os.path.expanduser("~/.cache/vantor/CurrentScene")))
 
-
-if __name__ == "__main__":
-    unittest.main()
+    def check_sessions(self):
+        """A session of a managed terminal has the client; one of another is left alone."""
+        checks = re.findall(r"`((?:grep|test|head) [^`]*)`", section("What a terminal needs first"))
+        self.assertEqual(len(checks), 4)
+        self.run_lines("\n".join(checks))
+        client = self.desktop.spawn(session_command())
+        roomclient.wait_syslog("renewCurrentScene")
+        self.desktop.wait("the tray icon", self.desktop.icon)
+        self.assertEqual(stop(client), 0)
+        write("/etc/zent/userinfo.json", b"{}")
+        self.assertEqual(self.desktop.spawn(session_command()).wait(20), 0)
