@@ -1,4 +1,3 @@
-#!/usr/bin/python3
 # SPDX-License-Identifier: Apache-2.0
 """The documents for administrators: both languages against each other, and the log lines against the sources."""
 
@@ -59,10 +58,6 @@ def log_calls():
     return calls, " ".join(" ".join(everything).split())
 
 
-def log_rows(path):
-    return [row for table in tables(path) for row in table if len(row) == 3 and row[1].split(";")[0] in LEVELS]
-
-
 class Operations(unittest.TestCase):
     def test_both_languages_say_the_same(self):
         for name in ("operations", "rollout"):
@@ -77,7 +72,8 @@ class Operations(unittest.TestCase):
 
     def test_log_lines_are_those_of_the_sources(self):
         calls, everything = log_calls()
-        rows = log_rows("docs/operations.md")
+        rows = [row for table in tables("docs/operations.md") for row in table
+                if len(row) == 3 and row[1].split(";")[0] in LEVELS]
         self.assertGreater(len(rows), 50)
         for row in rows:
             level = LEVELS[row[1].split(";")[0]]
@@ -89,7 +85,3 @@ class Operations(unittest.TestCase):
                     texts = [everything]
                 with self.subTest(line=line):
                     self.assertTrue(any(all(piece in text for piece in pieces) for text in texts), pieces)
-
-
-if __name__ == "__main__":
-    unittest.main()

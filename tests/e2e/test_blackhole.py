@@ -17,10 +17,6 @@ NEEDED = 98
 # by as much as a time-out of the client.
 SERIES = 3
 FREEZE_MS = 1000
-# The texts of the panel's page, and the buttons beside each other above it; within the panel.
-PAGE = (10, 180, 100, 100)
-NET_BUTTON = (220, 145)
-LOGIN_BUTTON = (80, 145)
 
 
 class Blackhole(ClientTest):
@@ -32,11 +28,11 @@ class Blackhole(ClientTest):
         panel = self.start_shown()
         roomclient.wait_syslog("failed: ", 20)
         left, top, _, _ = self.desktop.geometry(panel)
-        watch.area = (left + PAGE[0], top + PAGE[1], *PAGE[2:])
+        # The texts of the panel's page; the buttons are beside each other above them.
+        watch.area = (left + 10, top + 180, 100, 100)
         x, y, width, height = self.desktop.icon()
         # In the order of the clicks; those on the icon are so far from each other that two are no double click.
-        places = {"network page": (left + NET_BUTTON[0], top + NET_BUTTON[1]),
-                  "login page": (left + LOGIN_BUTTON[0], top + LOGIN_BUTTON[1]),
+        places = {"network page": (left + 220, top + 145), "login page": (left + 80, top + 145),
                   "close": (x + width // 4, y + height // 4), "open": (x + width * 3 // 4, y + height * 3 // 4)}
         pictures = {name: watch.settle(place) for name, place in places.items()}
         self.assertEqual(len(set(pictures.values())), 3, "the pictures do not differ")

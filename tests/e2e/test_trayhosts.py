@@ -5,7 +5,7 @@ import os
 import signal
 import subprocess
 
-from clienttest import TREE, ClientTest, roomclient
+from clienttest import TREE, ClientTest, read, roomclient
 
 ICON_SECONDS = 1
 # Of the client's main thread in a minute without a tray. The questions to the server make some 25; a timer that looked
@@ -35,8 +35,7 @@ class TrayHosts(ClientTest):
         roomclient.wait_syslog("message for another user not shown")
 
     def wake_ups(self):
-        with open(f"/proc/{self.client.pid}/status", encoding="ascii") as stream:
-            return int(next(line for line in stream if line.startswith("voluntary")).split()[1])
+        return int(read(f"/proc/{self.client.pid}/status").split(b"\nvoluntary_ctxt_switches:")[1].split()[0])
 
     def test_xembed_host_after_a_minute(self):
         self.start()
