@@ -132,11 +132,6 @@ class Desktop:
             "gdbus", "call", "--session", "-d", "org.freedesktop.DBus", "-o", "/org/freedesktop/DBus",
             "-m", "org.freedesktop.DBus.NameHasOwner", PORTAL))
 
-    def set_colour_scheme(self, scheme):
-        """Changes the setting of the portal that start_portal() started."""
-        self.run("gdbus", "call", "--session", "-d", PORTAL, "-o", "/org/freedesktop/portal/desktop",
-                 "-m", "com.vantor.sandbox.Portal.SetColorScheme", str(SCHEMES[scheme]))
-
     def set_background(self, colour):
         self.run("xsetroot", "-solid", colour)
 
