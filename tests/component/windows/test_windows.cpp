@@ -15,7 +15,7 @@
 #include "toolkitapplication.h"
 #include "toolkitlabel.h"
 
-#include <QDBusConnection>
+#include <QDBusConnectionInterface>
 
 namespace
 {
@@ -56,11 +56,21 @@ class TestWindows : public QObject
 {
     Q_OBJECT
 
+    /// Values that end so, on the page that is left for the other one where they end in nothing.
+    static void fill(InfoWidget& panel, const QString& end)
+    {
+        panel.setLoginInfo({"a" + end, "b" + end, "c" + end, "d" + end, "e" + end, "f" + end});
+        panel.setNetInfo({"1" + end, "2" + end, "3" + end, "4" + end, "5" + end, "6" + end, "7" + end, "8" + end});
+        for (const char* page : {"NetInfo", end.isEmpty() ? "LoginInfo" : "NetInfo"})
+            panel.findChild<QAbstractButton*>(page)->click();
+    }
     static QWidget* make(const QString& name)
     {
         if (name.startsWith("panel")) {
             auto* panel = new InfoWidget(nullptr, name.endsWith("administrator"));
             panel->setSceneBox(name.endsWith("administrator"));
+            if (name.contains("values"))
+                fill(*panel, name.contains("long") ? QString("<i>").repeated(12) : QString());
             return panel;
         }
         if (name == "main window")
@@ -112,11 +122,20 @@ class TestWindows : public QObject
     /// What other programs of the session ask for.
     static void useSession()
     {
+        QDBusConnection bus = QDBusConnection::sessionBus();
+        QDBusConnection other = QDBusConnection::connectToBus(QDBusConnection::SessionBus, "other");
+        other.registerService("com.vantor.tarn");
         MainWindow window(nullptr, 1020);
+        std::make_unique<SessionHost>(window);
+        qInfo() << bus.objectRegisteredAt("/com/vantor/tarn/Notification")
+                << bus.objectRegisteredAt("/com/vantor/tarn/Fullzone");
+        other.unregisterService("com.vantor.tarn");
+        std::make_unique<SessionHost>(window);
+        qInfo() << bus.interface()->isServiceRegistered("com.vantor.tarn").value();
         const SessionHost host(window);
         // The bus has the objects already.
         const SessionHost second(window);
-        QObject* object = QDBusConnection::sessionBus().objectRegisteredAt("/com/vantor/tarn/Notification");
+        QObject* object = bus.objectRegisteredAt("/com/vantor/tarn/Notification");
         auto* notification = qobject_cast<Notification*>(object);
         notification->Notify(1, "lisi", "title", "text", "sender");
         notification->GioMount("maker", "product", "serial", "no id");
