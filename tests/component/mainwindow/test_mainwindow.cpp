@@ -194,8 +194,7 @@ private slots:
         QTRY_COMPARE(processrecord::entries("oxa-shutdown").size(), 1);
         testfiles::write("/tmp/script", "脚本\n");
         QCOMPARE(m_window->readScriptsFile("/tmp/script"), QStringLiteral("脚本\n"));
-        for (const char* signal : {"sizeChanged()", "newMessage()", "readNotify(QString)", "startgetMeInfo()"})
-            QVERIFY2(m_window->metaObject()->indexOfSignal(signal) >= 0, signal);
+        QVERIFY(m_window->metaObject()->indexOfSignal("sizeChanged()") >= 0);
         QCOMPARE(m_window->generateRandnum(7, 7), 7);
         QCOMPARE(m_window->generateRandnum(8, 7), 7);
         // Within one second each call draws the same number.
