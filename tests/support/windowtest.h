@@ -28,10 +28,6 @@ protected:
         m_log.reset();
         m_log = std::make_unique<LogCapture>();
     }
-    void compareBoxes(const QJsonValue& expected)
-    {
-        fixture::compare(QJsonArray::fromStringList(m_boxes.texts), expected);
-    }
     void makeWindow(int unread)
     {
         m_platform.setUnread(unread);
