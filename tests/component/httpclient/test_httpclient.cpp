@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixture.h"
 #include "httpclientapi.h"
-#include "httprules.h"
 #include "lookups.h"
 #include "platformcontrol.h"
 
@@ -18,10 +17,7 @@ const QString kCa = "/etc/zent/clientapi_ca.crt";
 const QString kCert = "/etc/zent/QEL_Zent.pem";
 const QString kKey = "/etc/zent/.QEL_Zent.key";
 const QString kTls = "/run/room/tls/";
-const QString kServer = "https://server.zent.test:443";
-const QString kStatusUrl = kServer + "/uim/v3/client/status";
-const QString kJoinUrl = kServer + "/uim/v3/client/join";
-constexpr int kTimedOut = -QNetworkReply::TimeoutError;
+const QString kStatusUrl = "https://server.zent.test:443/uim/v3/client/status";
 /// More than a request that is not sent takes, less than any time-out.
 constexpr int kAtOnceMs = 300;
 
@@ -36,16 +32,9 @@ struct Client {
     }
     int get(const QString& url, const QString& body = {}) { return api.getRequest(reply, url, body, true); }
     int post(const QString& url, const QString& body) { return api.postRequest(reply, url, body, true); }
-    int poll(const QString& url) { return api.pollRequest(reply, url, {}); }
-    /// Fails unless a poll fails like that, with one line of the log; it waits where the line says how long.
-    void failPoll(const QString& url, const QString& reason, int result = kTimedOut)
+    int ask(const QString& kind, const QString& url)
     {
-        const LogCapture log;
-        QElapsedTimer timer;
-        timer.start();
-        QCOMPARE(poll(url), result);
-        QCOMPARE(timer.elapsed() > kAtOnceMs, reason.startsWith("failed"));
-        fixture::compareLog(log, QJsonArray{"warning GET \"" + url + "\" " + reason});
+        return kind == "get" ? get(url) : kind == "post" ? post(url, "{}") : api.pollRequest(reply, url, {});
     }
 
     HttpClientApi api{nullptr, false};
@@ -90,6 +79,8 @@ class TestHttpClient : public QObject
 private slots:
     void initTestCase()
     {
+        // Nothing but the server is asked.
+        QNetworkProxy::setApplicationProxy(QNetworkProxy(QNetworkProxy::HttpProxy, "127.0.0.1", 9));
         // Debian's own configuration refuses old versions of TLS, whatever a client does.
         testfiles::write(file("openssl.cnf"), "openssl_conf = all\n[all]\nssl_conf = ssl\n[ssl]\nsystem_default = any\n"
                                               "[any]\nMinProtocol = TLSv1\nCipherString = ALL:@SECLEVEL=0\n");
@@ -150,51 +141,17 @@ private slots:
         fixture::compareLog(log, row["log"]);
     }
 
-    void nothingButTheServerIsAsked()
-    {
-        const QJsonObject headers{{"Set-Cookie", "a=b; Path=/"}, {"Cache-Control", "public, max-age=600"}};
-        m_platform.addFault({{"path", "/t"}}, {{"body", "{}"}, {"headers", headers}});
-        QNetworkProxy::setApplicationProxy(QNetworkProxy(QNetworkProxy::HttpProxy, "127.0.0.1", 9));
-        Client client;
-        const QList<int> results{client.get(kServer + "/t"), client.get(kServer + "/t"),
-                                 client.get("http://server.zent.test:0/none")};
-        QNetworkProxy::setApplicationProxy(QNetworkProxy::NoProxy);
-        QCOMPARE(results, QList<int>({200, 200, 404}));
-        const QList<QJsonObject> requests = m_platform.record("http");
-        QCOMPARE(requests.size(), 3);
-        QVERIFY(!requests[1]["headers"].toObject().contains("cookie"));
-    }
-
-    void theAuthoritysFileIsFollowed()
-    {
-        const QString ca = file("ca.crt");
-        QCOMPARE(zent::http::tlsBesideSystem(kCa).protocol(), QSsl::TlsV1_2OrLater);
-        Client client;
-        client.api.setSSLConfig(ca, kCert, kKey);
-        for (const QString& copied : {QString(), kCa, kTls + "unknown_ca.crt"}) {
-            if (!copied.isEmpty())
-                testfiles::write(ca, testfiles::read(copied));
-            QCOMPARE(client.get(kStatusUrl), copied == kCa ? 200 : -QNetworkReply::SslHandshakeFailedError);
-        }
-    }
-
     void theThreadEndsWhenNothingIsAsked()
     {
         Client client(-1);
         QCOMPARE(client.get(kStatusUrl), 200);
         QCOMPARE(threadsNamed("http"), 1);
         QTRY_COMPARE_WITH_TIMEOUT(threadsNamed("http"), 0, 15000);
-        m_platform.addFault({{"path", "*/status"}}, {{"delay_ms", 3000}});
-        m_platform.addFault({{"path", "*/join"}}, {{"delay_ms", 1500}});
-        client.failPoll(kStatusUrl, "failed: no reply within 2000 ms");
-        client.failPoll(kStatusUrl, "not sent: server.zent.test:443 gave no reply in time, next try in * s");
-        // Any answer ends that; the late one of the poll does not come in between.
-        QCOMPARE(client.post(kJoinUrl, "{}"), 200);
-        m_platform.clearFaults();
-        QCOMPARE(client.poll(kStatusUrl), 200);
-        m_platform.addFault({{"path", "*/join"}}, {{"hang", true}});
+        m_platform.addFault({{"path", "*"}}, {{"hang", true}});
         client.api.setReplyTimer(0);
-        client.failPoll(kJoinUrl, "failed: no reply within 1000 ms");
+        const LogCapture log;
+        QCOMPARE(client.get(kStatusUrl), -QNetworkReply::TimeoutError);
+        QVERIFY(log.contains("no reply within 1000 ms"));
         QElapsedTimer timer;
         timer.start();
         QVERIFY(QMetaObject::invokeMethod(qApp, "aboutToQuit"));
@@ -203,73 +160,35 @@ private slots:
         QTRY_COMPARE(threadsNamed("http"), 0);
     }
 
-    void unreachableHostIsTriedInTheBackground()
+    /// Comes last: a look-up that is not answered stays open.
+    void outages_data() { fixture::addRows("outages.json"); }
+    void outages()
     {
-        m_platform.patchState({{"black_hole", true}});
-        Client client;
-        client.failPoll(kStatusUrl, "failed: no connection within 1500 ms");
-        // Another port of the same host stands for itself.
-        client.failPoll("http://server.zent.test/none", "failed: no reply within 2000 ms");
-        // What is no poll is sent all the same.
-        QElapsedTimer timer;
-        timer.start();
-        QVERIFY(client.get(kStatusUrl) == kTimedOut && timer.elapsed() > kAtOnceMs);
-        client.failPoll(kStatusUrl, "not sent: no connection to server.zent.test:443 so far");
-        client.failPoll("http://server.zent.test/none",
-                        "not sent: server.zent.test:80 gave no reply in time, next try in * s");
-        const LogCapture log;
-        m_platform.patchState({{"black_hole", false}});
-        QTRY_VERIFY_WITH_TIMEOUT(log.contains("server.zent.test:443 answers again"), 10000);
-        QVERIFY(m_platform.record("http").isEmpty());
-        QCOMPARE(client.get(kStatusUrl), 200);
-    }
-
-    void aRefusalEndsTheOutage()
-    {
-        m_platform.patchState({{"black_hole", true}});
-        Client client;
-        client.failPoll(kStatusUrl, "failed: no connection within 1500 ms");
-        m_platform.patchState({{"black_hole", false}, {"listening", false}});
-        // No event loop runs in between.
-        const LogCapture log;
-        QCOMPARE(client.get(kStatusUrl), -QNetworkReply::ConnectionRefusedError);
-        QCOMPARE(log.records().value(0), QString("info server.zent.test:443 answers again"));
-        m_platform.patchState({{"listening", true}});
-        QCOMPARE(client.poll(kStatusUrl), 200);
-        // A connection that is open already falls silent instead.
-        m_platform.patchState({{"black_hole", true}});
-        client.failPoll(kStatusUrl, "failed: no reply within 2000 ms");
-    }
-
-    void slowHostsAreHeldBack()
-    {
-        m_platform.addFault({{"path", "/slow"}}, {{"delay_ms", 250}, {"status", 503}});
-        Client client;
-        QCOMPARE(client.poll(kServer + "/slow"), 503);
-        client.failPoll(kServer + "/slow", "not sent: server.zent.test:443 is slow to answer, next try in * s");
-        QCOMPARE(client.get(kServer + "/slow"), 503);
-        // It is asked thrice, and no connection is known to have come about.
-        m_platform.addFault({{"path", "/late"}}, {{"delay_ms", 400}, {"status", 204}, {"drop", "mid"}});
-        const QString late = "http://server.zent.test:80/late";
-        constexpr int kClosed = -QNetworkReply::RemoteHostClosedError;
-        client.failPoll(late, "failed: Connection closed", kClosed);
-        client.failPoll(late, "not sent: no connection to server.zent.test:80 so far", kClosed);
-    }
-
-    void silentNameServerCountsAsConnectTimeOut()
-    {
+        QFETCH(QJsonObject, row);
         // Without a socket the port would be unreachable, which ends a lookup at once.
         QUdpSocket nameServer;
+        nameServer.setProxy(QNetworkProxy::NoProxy);
         QVERIFY2(nameServer.bind(QHostAddress("127.0.0.53"), 53), qPrintable(nameServer.errorString()));
+        auto client = std::make_unique<Client>(-1);
         QElapsedTimer timer;
-        timer.start();
-        {
-            Client client;
-            client.failPoll("https://silent.zent.test/", "failed: no connection within 1500 ms");
-            client.failPoll("https://silent.zent.test/", "not sent: no connection to silent.zent.test:443 so far");
+        for (const QJsonValue& step : row["steps"].toArray()) {
+            for (const QJsonValue& fault : step["faults"].toArray())
+                m_platform.addFault({{"path", fault["path"]}}, fault["action"].toObject());
+            const LogCapture log;
+            if (step["state"].isObject())
+                m_platform.patchState(step["state"].toObject());
+            if (step["until"].isString())
+                QTRY_VERIFY_WITH_TIMEOUT(log.contains(step["until"].toString()), 10000);
+            timer.start();
+            fixture::compare(client->ask(step["kind"].toString("poll"), step["url"].toString(kStatusUrl)),
+                             step["result"]);
+            if (step["waits"].isBool())
+                QCOMPARE(timer.elapsed() > kAtOnceMs, step["waits"].toBool());
+            fixture::compareLog(log, step["log"]);
         }
-        // Discarding the client does not wait for the lookup either.
-        QVERIFY2(timer.elapsed() <= 2300, qPrintable(QString::number(timer.elapsed())));
+        timer.start();
+        client.reset();
+        QVERIFY2(timer.elapsed() < 1000, qPrintable(QString::number(timer.elapsed())));
     }
 };
 
