@@ -23,13 +23,7 @@ constexpr int kAtOnceMs = 300;
 
 /// A client with the terminal's own certificates, and its last reply.
 struct Client {
-    /// @param seconds for a reply; what the client does by itself when negative
-    explicit Client(int seconds = 2)
-    {
-        if (seconds >= 0)
-            api.setReplyTimer(seconds);
-        api.setSSLConfig(kCa, kCert, kKey);
-    }
+    Client() { api.setSSLConfig(kCa, kCert, kKey); }
     int get(const QString& url, const QString& body = {}) { return api.getRequest(reply, url, body, true); }
     int post(const QString& url, const QString& body) { return api.postRequest(reply, url, body, true); }
     int ask(const QString& kind, const QString& url)
@@ -108,7 +102,8 @@ private slots:
     {
         QFETCH(QJsonObject, row);
         const LogCapture log;
-        Client client(20);
+        Client client;
+        client.api.setReplyTimer(20);
         QCOMPARE(client.get(kStatusUrl), 200);
         const QJsonValue connection = m_platform.record("http").last()["connection"];
         m_platform.clearRecord();
@@ -143,7 +138,7 @@ private slots:
 
     void theThreadEndsWhenNothingIsAsked()
     {
-        Client client(-1);
+        Client client;
         QCOMPARE(client.get(kStatusUrl), 200);
         QCOMPARE(threadsNamed("http"), 1);
         QTRY_COMPARE_WITH_TIMEOUT(threadsNamed("http"), 0, 15000);
@@ -169,7 +164,7 @@ private slots:
         QUdpSocket nameServer;
         nameServer.setProxy(QNetworkProxy::NoProxy);
         QVERIFY2(nameServer.bind(QHostAddress("127.0.0.53"), 53), qPrintable(nameServer.errorString()));
-        auto client = std::make_unique<Client>(-1);
+        auto client = std::make_unique<Client>();
         QElapsedTimer timer;
         for (const QJsonValue& step : row["steps"].toArray()) {
             for (const QJsonValue& fault : step["faults"].toArray())

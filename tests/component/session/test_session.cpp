@@ -1,24 +1,35 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "desktopnotifier.h"
 #include "fixture.h"
+#include "mainwindow.h"
 #include "notificationserver.h"
+#include "notify.h"
 #include "processrecord.h"
 #include "resumedialog.h"
+#include "sessionhost.h"
+#include "sizedicon.h"
+#include "toolkittitlebar.h"
+#include "trayclicks.h"
+#include "trayhost.h"
+#include "trayicon.h"
+#include "trayregistry.h"
 
-#include <QDBusServiceWatcher>
+#include <QDBusConnectionInterface>
 #include <QSignalSpy>
 
-/// What the session's other programs make the client show: notifications of the desktop, and the dialog of a failed
-/// verification.
+/// What the client shows and takes on the desktop beside its windows: the tray icon, notifications, and the dialog of a
+/// failed verification.
 class TestSession : public QObject
 {
     Q_OBJECT
 
+    std::unique_ptr<MainWindow> m_window;
     std::unique_ptr<DesktopNotifier> m_notifier;
     std::unique_ptr<NotificationServer> m_server;
     std::unique_ptr<QSignalSpy> m_activated;
     std::unique_ptr<QSignalSpy> m_unavailable;
 
+    void makeWindow() { m_window = std::make_unique<MainWindow>(nullptr, 1029); }
     void startServer(const QStringList& capabilities = {"actions", "body", "body-markup"})
     {
         m_server.reset();
@@ -26,17 +37,13 @@ class TestSession : public QObject
     }
 
     /// Lets everything arrive that was under way before: the bus keeps the order of a connection's messages.
-    void settle()
+    void settle() const
     {
-        const QString name = QString("com.vantor.test.settle%1").arg(++m_round);
-        QDBusServiceWatcher watcher(name, QDBusConnection::sessionBus(), QDBusServiceWatcher::WatchForRegistration);
-        QSignalSpy seen(&watcher, &QDBusServiceWatcher::serviceRegistered);
-        QDBusConnection other = QDBusConnection::connectToBus(QDBusConnection::SessionBus, name);
-        if (!other.registerService(name) || !(seen.size() || seen.wait()))
-            qFatal("the bus does not answer");
-        QDBusConnection::disconnectFromBus(name);
+        const QString asked = m_server ? NotificationServer::service() : "org.freedesktop.DBus";
+        QDBusConnection::sessionBus().call(
+            QDBusMessage::createMethodCall(asked, "/", "org.freedesktop.DBus.Peer", "Ping"), QDBus::BlockWithGui);
+        QCoreApplication::processEvents();
     }
-    int m_round = 0;
 
     /// Shows one message and waits until the notifier knows its id.
     void showOne()
@@ -57,9 +64,82 @@ private slots:
 
     void cleanup()
     {
+        m_window.reset();
         m_notifier.reset();
         m_server.reset();
         settle();
+    }
+
+    void clicksOnTheIcon()
+    {
+        using Tray = QSystemTrayIcon;
+        makeWindow();
+        auto* icon = m_window->findChild<TrayIcon*>();
+        const QPoint corner = m_window->pos();
+        m_window->move(-50, 10);
+        const std::pair<Tray::ActivationReason, bool> clicks[] = {
+            {Tray::Trigger, false}, {Tray::Trigger, true},      {Tray::Context, true},
+            {Tray::Trigger, true},  {Tray::Unknown, true},      {Tray::DoubleClick, true},
+            {Tray::Trigger, false}, {Tray::MiddleClick, false}, {Tray::Trigger, true}};
+        for (const auto& [reason, shown] : clicks) {
+            emit icon->activated(reason);
+            QVERIFY2(m_window->isVisible() == shown, qPrintable(QString("click %1").arg(reason)));
+        }
+        QCOMPARE(m_window->pos(), corner);
+        QTRY_VERIFY(m_window->hasFocus());
+        m_window->close();
+        QVERIFY(m_window->isHidden());
+        emit m_window->findChild<ToolkitTitlebar*>()->windowDragged();
+        m_window->move(-50, 10);
+        emit icon->activated(Tray::Trigger);
+        QVERIFY(m_window->isVisible());
+        QCOMPARE(m_window->pos(), QPoint(-50, 10));
+
+        // Of a host that reports every click as one of its own.
+        QList<int> meant;
+        TrayClicks single;
+        for (const auto reason : {Tray::Trigger, Tray::Trigger, Tray::Trigger, Tray::MiddleClick, Tray::Trigger})
+            single.pass(Tray(), reason, [&](auto meaning) { meant.append(meaning); });
+        QCOMPARE(meant, QList<int>({3, 2, 3, 4, 3}));
+    }
+
+    void shutdownEndsTheWaitForATray()
+    {
+        makeWindow();
+        m_window->setSysThemetype(2);
+        for (const bool ended : {true, false}) {
+            makeWindow();
+            const SessionHost host(*m_window);
+            m_window->show();
+            if (ended)
+                m_window->shutdown();
+            QCOMPARE(m_window->isHidden(), ended);
+            const TrayHostWatch witness;
+            QSignalSpy appeared(&witness, &TrayHostWatch::hostAppeared);
+            const LogCapture log;
+            const TrayRegistry registry;
+            QTRY_COMPARE(appeared.count(), 1);
+            QVERIFY(log.records().contains("info TrayHostWatch a tray host is there"));
+            QCOMPARE(m_window->findChild<QSystemTrayIcon*>() != nullptr, !ended);
+            // Of a tray that shows no balloons, or of none.
+            emit host.findChild<Notification*>()->onMessage(1, "", "title", "text", "sender");
+            QTRY_VERIFY(log.records().contains(
+                "warning SessionHost neither a notification service nor a tray shows the message"));
+        }
+        const auto* icon = m_window->findChild<QSystemTrayIcon*>();
+        QCOMPARE(icon->toolTip(), QStringLiteral("终端域管平台"));
+        const QList<QSize> sizes{{16, 16}, {22, 22}, {24, 24}, {32, 32}, {48, 48}, {64, 64}};
+        QCOMPARE(icon->icon().availableSizes(), sizes);
+        const char* const files[] = {"finalogo", "tarn", "tarn_dark"};
+        for (int theme = 0; theme <= 2; ++theme) {
+            if (theme > 0)
+                m_window->setSysThemetype(theme);
+            const QImage drawn = zent::sizedIcon(QString(":/images/%1.svg").arg(files[theme])).pixmap(64).toImage();
+            QVERIFY2(!drawn.isNull() && icon->icon().pixmap(64).toImage() == drawn, files[theme]);
+        }
+        QVERIFY(icon->isVisible());
+        m_window->shutdown();
+        QVERIFY(!icon->isVisible());
     }
 
     void showsTheMessage()
@@ -90,6 +170,7 @@ private slots:
         QDBusMessage forged =
             QDBusMessage::createSignal(NotificationServer::path(), NotificationServer::service(), "ActionInvoked");
         QVERIFY(stranger.send(forged << ours << "default"));
+        QVERIFY(stranger.interface()->isServiceRegistered(NotificationServer::service()));
         emit m_server->ActionInvoked(ours + 1, "default");
         emit m_server->ActionInvoked(ours, "other");
         settle();
