@@ -94,7 +94,6 @@ class TestFaults : public QObject
         emit m_window->startgetMeInfo();
         m_window->getAreaInfo();
         QCoreApplication::processEvents();
-        // Nobody takes in what comes for the others while these hold the window up.
         tryRelease();
         HttpRequest::GetInstance()->postQuitControl("zhangsan");
     }
@@ -150,6 +149,8 @@ private slots:
         const LogCapture log;
         setFault(row["state"].toObject(), row["action"].toObject());
         start();
+        // While this holds the window up, nobody takes in what comes for the others.
+        m_platform.addFault({{"path", "*/remove"}}, {{"hang", true}});
         // A service that keeps silent is given up soon.
         QNotification::qInstance->setTimeLimit(10s);
         tryRelease();
@@ -161,7 +162,8 @@ private slots:
             QTRY_VERIFY2_WITH_TIMEOUT(log.contains(line.toString()), qPrintable(line.toString()), kPatienceMs);
         QTRY_COMPARE(m_readSuccesses, row["read"].toInt());
         QCOMPARE(known(), QString("||| 0"));
-        QVERIFY2(memory("VmHWM") - before < 100, qPrintable(QString::number(memory("VmHWM") - before)));
+        // Five replies, each kept by Qt's threads and by the client; without a bound it is all that comes in 2 s.
+        QVERIFY2(memory("VmHWM") - before < 360, qPrintable(QString::number(memory("VmHWM") - before)));
 
         // What a person or a poll does next succeeds.
         setFault({});
