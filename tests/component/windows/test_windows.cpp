@@ -38,7 +38,10 @@ QStringList cutOff(const QWidget& window)
                                                            : 0;
         const QRect area = widget->contentsRect();
         const QRect ink = widget->fontMetrics().tightBoundingRect(text).translated(0, label ? label->baseline() : 0);
-        const int width = widget->fontMetrics().size(Qt::TextShowMnemonic, text).width() + around;
+        const QFontMetrics metrics = widget->fontMetrics();
+        // Qt rounds the width of an elided text up.
+        const int width =
+            label ? metrics.horizontalAdvance(text) - 1 : metrics.size(Qt::TextShowMnemonic, text).width() + around;
         const bool fits = label && label->wordWrap() ? label->heightForWidth(area.width()) <= area.height()
                           : label ? width <= area.width() && ink.top() >= area.top() && ink.bottom() <= area.bottom()
                                   : width <= area.width() && ink.height() <= area.height();
@@ -181,7 +184,7 @@ private slots:
             if (auto* link = window->findChild<QAbstractButton*>(page))
                 link->click();
             QTest::qWait(0);
-            fixture::compareLines(cutOff(*window), QJsonArray());
+            fixture::compareLines(cutOff(*window), row["cut"].toObject()[page]);
         }
     }
 
