@@ -4,10 +4,6 @@
 #include "logcapture.h"
 #include "testfiles.h"
 
-#include <QJsonArray>
-#include <QJsonDocument>
-#include <QJsonObject>
-#include <QRegularExpression>
 #include <QtTest>
 
 /// Tables of whole requests and replies, kept below tests/data: an object with a named object for each row.

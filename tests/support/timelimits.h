@@ -3,8 +3,6 @@
 
 #include <QAbstractEventDispatcher>
 
-#include <ctime>
-
 /// How many timers of so many milliseconds wait that QTimer::singleShot started in this thread.
 inline int singleShots(int milliseconds)
 {
@@ -15,12 +13,4 @@ inline int singleShots(int milliseconds)
             count += info.interval == milliseconds ? 1 : 0;
     }
     return count;
-}
-
-/// The processor time of this thread: the machine may be busy with something else.
-inline double processorMs()
-{
-    timespec now{};
-    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &now);
-    return static_cast<double>(now.tv_sec) * 1e3 + static_cast<double>(now.tv_nsec) / 1e6;
 }

@@ -2,7 +2,6 @@
 #pragma once
 
 #include <QFont>
-#include <QJsonArray>
 #include <QWidget>
 #include <QtTest>
 

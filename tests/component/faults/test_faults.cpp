@@ -14,9 +14,7 @@
 #include "sessionhost.h"
 #include "toolkitpasswordedit.h"
 
-#include <QComboBox>
-#include <QLabel>
-#include <QPlainTextEdit>
+#include <QtWidgets>
 
 using namespace std::chrono_literals;
 

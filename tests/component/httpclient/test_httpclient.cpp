@@ -4,10 +4,7 @@
 #include "lookups.h"
 #include "platformcontrol.h"
 
-#include <QElapsedTimer>
 #include <QNetworkProxy>
-#include <QProcess>
-#include <QTemporaryDir>
 #include <QUdpSocket>
 
 namespace

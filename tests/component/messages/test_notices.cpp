@@ -3,8 +3,6 @@
 #include "trayicon.h"
 #include "windowtest.h"
 
-#include <QSignalSpy>
-
 /// The message dialog as the window opens it, with the notification service behind.
 class TestNotices : public WindowTest
 {

@@ -3,8 +3,7 @@
 #include "toolkitpasswordedit.h"
 #include "windowtest.h"
 
-#include <QPointer>
-#include <QPushButton>
+#include <QtWidgets>
 
 namespace
 {

@@ -6,10 +6,7 @@
 #include "toolkitspinner.h"
 #include "windowtest.h"
 
-#include <QElapsedTimer>
-#include <QPushButton>
-#include <QScreen>
-#include <QSignalSpy>
+#include <QtWidgets>
 
 class TestRelease : public WindowTest
 {

@@ -9,6 +9,8 @@
 
 #include <QSslConfiguration>
 
+#include <ctime>
+
 using namespace std::chrono_literals;
 
 namespace
@@ -185,9 +187,9 @@ private slots:
         if (!row["slow"].toBool())
             return;
         QVERIFY(zent::matchPcName(rule, QString(255, 'a')).whole);
-        const double began = processorMs();
+        const std::clock_t began = std::clock();
         zent::matchPcName(rule, QString(254, 'a') + '!');
-        QVERIFY2(processorMs() - began < 500, "a name that nearly fits takes long");
+        QVERIFY2(std::clock() - began < CLOCKS_PER_SEC / 2, "a name that nearly fits takes long");
     }
 
     void macAddress_data() { fixture::addRows("connections.json"); }

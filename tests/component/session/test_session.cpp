@@ -15,7 +15,6 @@
 #include "trayregistry.h"
 
 #include <QDBusConnectionInterface>
-#include <QSignalSpy>
 
 /// What the client shows and takes on the desktop beside its windows: the tray icon, notifications, and the dialog of a
 /// failed verification.

@@ -10,8 +10,6 @@
 #include "unreadpoll.h"
 
 #include <QNetworkAccessManager>
-#include <QSignalSpy>
-#include <QTimer>
 
 #include <ctime>
 #include <dlfcn.h>

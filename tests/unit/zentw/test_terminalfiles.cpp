@@ -6,8 +6,6 @@
 #include "fixture.h"
 #include "jsonreader.h"
 
-#include <QTemporaryDir>
-
 #include <csignal>
 #include <sched.h>
 #include <sys/mount.h>
