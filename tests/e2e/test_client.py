@@ -94,12 +94,13 @@ class Used(ClientTest):
             roomclient.set_standin(name, hook="for fd in /proc/$$/fd/*; do printf '%s ' ${fd##*/}; "
                                    f"readlink $fd || echo gone; done > {path}.$$; mv {path}.$$ {path}")
             self.addCleanup(roomclient.set_standin, name)
-        # One more than it needs, and an open input.
+        # One more than it needs, an open input, and no output.
         read_end, write_end = os.pipe()
         self.addCleanup(os.close, write_end)
-        self.client = self.desktop.spawn([CLIENT], stdin=read_end, pass_fds=[read_end])
+        self.client = self.desktop.spawn(["sh", "-c", 'exec "$0" >&-', CLIENT], stdin=read_end, pass_fds=[read_end])
         os.close(read_end)
         roomclient.wait_syslog("renewCurrentScene")
+        self.assertEqual(os.readlink(f"/proc/{self.client.pid}/fd/1"), "/dev/null")
         self.push("GioMount", "a", "b", "SER1", "1000")
         # The devices are unmounted before the reply.
         self.assertTrue(os.path.exists(kept["gio"]))
