@@ -2,6 +2,7 @@
 #include "boxcloser.h"
 #include "closeguarddialog.h"
 #include "fixture.h"
+#include "httpclientapi.h"
 #include "httprequest.h"
 #include "infowidget.h"
 #include "mainwindow.h"
@@ -140,6 +141,9 @@ private slots:
         m_window.reset();
     }
 
+    /// What a thread that outlives the application leaves is never destroyed.
+    void cleanupTestCase() { delete HttpRequest::GetInstance()->findChild<HttpClientApi*>(); }
+
     void everyRequestUnder_data() { fixture::addRows("faults.json"); }
     void everyRequestUnder()
     {
@@ -161,7 +165,8 @@ private slots:
         QTRY_COMPARE(m_readSuccesses, row["read"].toInt());
         QCOMPARE(known(), QString("||| 0"));
         // Five replies, each kept by Qt's threads and by the client; without a bound it is all that comes in 2 s.
-        QVERIFY2(memory("VmHWM") - before < 360, qPrintable(QString::number(memory("VmHWM") - before)));
+        const bool endless = row["action"].toObject()["endless"].toBool();
+        QVERIFY2(!endless || memory("VmHWM") - before < 360, qPrintable(QString::number(memory("VmHWM") - before)));
 
         // What a person or a poll does next succeeds.
         setFault({});
@@ -171,7 +176,7 @@ private slots:
         QTRY_COMPARE_WITH_TIMEOUT(known(), all, kPatienceMs);
         QTRY_VERIFY_WITH_TIMEOUT(scenes()->count() > 0 && m_readSuccesses == 1, kPatienceMs);
         // No large reply is kept.
-        QTRY_VERIFY(memory("VmRSS") - before < 14);
+        QTRY_VERIFY(!endless || memory("VmRSS") - before < 14);
         setFault(row["state"].toObject(), row["action"].toObject());
         m_window->getusrInfo();
         m_window->getAreaInfo();
