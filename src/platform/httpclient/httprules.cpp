@@ -64,10 +64,9 @@ QByteArray fingerprint(const TlsFiles& files)
 {
     QByteArray bytes;
     for (const QString& path : {files.ca, files.cert, files.key}) {
-        const QByteArray name = QFile::encodeName(path);
-        bytes += name + '\0';
+        bytes += '\0';
         struct stat status = {};
-        if (path.isEmpty() || stat(name.constData(), &status) != 0)
+        if (path.isEmpty() || stat(QFile::encodeName(path).constData(), &status) != 0)
             continue;
         for (const auto number :
              {static_cast<qint64>(status.st_mtim.tv_sec), static_cast<qint64>(status.st_mtim.tv_nsec),

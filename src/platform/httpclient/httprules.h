@@ -36,7 +36,7 @@ struct TlsFiles {
     QString key;  ///< its private key; looked for in `cert` when empty
 };
 
-/// Changes whenever a file is named, written, replaced or removed.
+/// Changes whenever another file is named, and when one is written, replaced or removed.
 QByteArray fingerprint(const TlsFiles& files);
 
 /// The configuration of a server that only the given authority vouches for. On failure `problem` says which file is to

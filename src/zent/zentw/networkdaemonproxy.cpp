@@ -14,14 +14,9 @@
 namespace
 {
 
-/// A daemon that leaves the bus ends a call at once, with an error of the same names as a time-out.
+/// A daemon that leaves the bus ends a call at once, with an error of the same name as a time-out.
 constexpr int kHangMs = 1000;
 constexpr int kPauseMs = 60000;
-
-bool isTimeOut(QDBusError::ErrorType type)
-{
-    return type == QDBusError::NoReply || type == QDBusError::Timeout || type == QDBusError::TimedOut;
-}
 
 /// Every proxy waits for the same daemon.
 QDeadlineTimer& pause()
@@ -47,7 +42,7 @@ std::optional<QString> NetworkDaemonProxy::activeConnectionInfo()
     QDBusPendingCall call = asyncCall(QStringLiteral("GetActiveConnectionInfo"));
     call.waitForFinished();
     if (call.isError()) {
-        const bool hangs = isTimeOut(call.error().type()) && waited.hasExpired(kHangMs);
+        const bool hangs = call.error().type() == QDBusError::NoReply && waited.hasExpired(kHangMs);
         if (hangs)
             pause().setRemainingTime(kPauseMs);
         qWarning().noquote() << "GetActiveConnectionInfo failed:" << call.error().name() << call.error().message()

@@ -30,8 +30,8 @@ struct WrittenOut {
 
 /// The steps of a match are bounded by characters × choices × the length of the name.
 constexpr WrittenOut kMost{512, 32, 2};
-/// A reference to a group: QRegExp reads places that it has never written for some, and crashes.
-constexpr WrittenOut kReference{kMost.characters + 1, 0, 0};
+/// A part for which the whole rule is refused.
+constexpr WrittenOut kRefused{kMost.characters + 1, 0, 0};
 /// What is looked ahead for is searched from many places, so it counts as repeated.
 constexpr int kLookAheadTimes = 16;
 
@@ -72,7 +72,9 @@ WrittenOut readGroup(QRegularExpressionMatchIterator& tokens)
         if (text == QLatin1String(")"))
             break;
         if (QStringLiteral("?*+{").contains(text.at(0))) {
-            last = quantified(last, token);
+            // QRegExp takes what follows an unfinished count for its "}", and so reads another rule than this does.
+            const bool isUnfinished = text.startsWith(QLatin1Char('{')) && !text.endsWith(QLatin1Char('}'));
+            last = isUnfinished ? kRefused : quantified(last, token);
             continue;
         }
         before = before + last;
@@ -84,7 +86,8 @@ WrittenOut readGroup(QRegularExpressionMatchIterator& tokens)
         } else if (text == QLatin1String("|")) {
             last = {0, 1, 0};
         } else if (text.size() == 2 && text.at(1) >= QLatin1Char('1') && text.at(1) <= QLatin1Char('9')) {
-            last = kReference;
+            // A reference to a group: QRegExp reads places that it has never written for some, and crashes.
+            last = kRefused;
         } else {
             const bool isAnchor = text == QLatin1String("^") || text == QLatin1String("$");
             last = {isAnchor ? 0 : 1, 0, 0};
@@ -142,7 +145,6 @@ QString withoutSlashes(const QString& rule)
 bool isBearableRule(const QString& rule)
 {
     // An escaped character, a class, the beginning of a group, a counted repetition, or any one character.
-    // QRegExp repeats before it misses the "}" of a count.
     static const QRegularExpression kToken(
         QStringLiteral(R"(\\.|\[\^?(?:\\.|.)(?:\\.|[^\]\\])*\]|\(\?[:=!]|\{(\d*)(?:,(\d*))?\}?|.)"),
         QRegularExpression::DotMatchesEverythingOption);

@@ -42,7 +42,8 @@ QString withoutSlashes(const QString& rule);
 /// Whether the rule may be compiled: a few bytes from the server could otherwise keep the client busy for minutes. With
 /// "a{1,3}" counted as three characters, a rule may have at most 512 characters and at most 32 choices: parts that may
 /// be absent ("?", "*", "{0,n}") and alternatives ("|"). Repetitions stand within repetitions at most two deep. What
-/// is looked ahead for counts 16 times, and as a repetition. References to groups ("\1") are refused.
+/// is looked ahead for counts 16 times, and as a repetition. References to groups ("\1") and unfinished
+/// counts ("{3") are refused.
 bool isBearableRule(const QString& rule);
 
 /// What a naming rule matches of a name.

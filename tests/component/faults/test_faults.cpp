@@ -141,7 +141,7 @@ private slots:
         m_window.reset();
     }
 
-    /// What a thread that outlives the application leaves is never destroyed.
+    /// The client's thread ends while Qt can still destroy what lives in it.
     void cleanupTestCase() { delete HttpRequest::GetInstance()->findChild<HttpClientApi*>(); }
 
     void everyRequestUnder_data() { fixture::addRows("faults.json"); }

@@ -28,7 +28,6 @@ public:
     bool isSequential() const override { return true; }
     // Qt tries to go back to the start, and would warn of its own attempt.
     bool seek(qint64) override { return false; }
-    bool atEnd() const override { return m_read == m_body.size(); }
     qint64 bytesAvailable() const override { return m_body.size() - m_read; }
 
 protected:
@@ -159,7 +158,7 @@ void Speaker::end(Result result)
 
 void Speaker::abandon(const std::shared_ptr<Exchange>& exchange)
 {
-    if (m_reply && m_exchange == exchange)
+    if (m_exchange == exchange)
         m_reply->abort();
 }
 

@@ -51,9 +51,6 @@ SignalQuit::~SignalQuit()
     for (const int number : kSignals)
         std::signal(number, SIG_DFL);
     delete m_notifier;
-    for (int& end : pipeEnds) {
-        if (end >= 0)
-            close(end);
-        end = -1;
-    }
+    for (const int end : pipeEnds)
+        close(end);
 }

@@ -61,8 +61,7 @@ bool saysHosted(const QDBusMessage& reply)
 /// Whether a registry is on the bus and keeps silent.
 bool isSilence(const QDBusMessage& reply)
 {
-    const QDBusError::ErrorType error = QDBusError(reply).type();
-    return error == QDBusError::NoReply || error == QDBusError::Timeout || error == QDBusError::TimedOut;
+    return QDBusError(reply).type() == QDBusError::NoReply;
 }
 
 } // namespace
