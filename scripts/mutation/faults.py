@@ -158,7 +158,7 @@ class Points:
         value = self.content[start:end]
         if value in ("true", "false"):
             changed = "false" if value == "true" else "true"
-        elif value in ("{}", "nullptr", "0", "-1", "std::nullopt") or words[1].kind == "number":
+        elif value in ("{}", "nullptr", "0", "-1", "std::nullopt", "QString()") or words[1].kind == "number":
             return
         elif {"&&", "||", "==", "!=", "<", ">", "<=", ">=", "!"}.intersection(word.text for word in words):
             changed = f"!({value})"

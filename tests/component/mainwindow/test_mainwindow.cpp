@@ -15,6 +15,8 @@
 
 #include <csignal>
 #include <sys/resource.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 class TestMainWindow : public WindowTest
 {
@@ -174,15 +176,31 @@ private slots:
         QCOMPARE(refused, -2);
     }
 
-    void agreedInterface()
+    void withoutConfigurationTheClientEnds()
     {
         m_window->getConfig();
         QVERIFY(m_window->whetherJoinGuard());
         QVERIFY(QFile::rename(testfiles::kInfoFile, "/tmp/info"));
         const LogCapture log;
         QVERIFY(!m_window->whetherJoinGuard());
-        QVERIFY(QFile::rename("/tmp/info", testfiles::kInfoFile));
         fixture::compareLog(log, QJsonArray{"info no config.json to use, error code:  5 , error detail: *"});
+        m_boxes.instead = [this] { testfiles::write("/tmp/box", m_boxes.texts[0].toUtf8()); };
+        const pid_t child = fork();
+        if (child == 0) {
+            m_window->getConfig();
+            _exit(0);
+        }
+        m_boxes.instead = nullptr;
+        int status = 0;
+        QVERIFY(waitpid(child, &status, 0) == child && WIFEXITED(status));
+        QCOMPARE(WEXITSTATUS(status), 255);
+        QCOMPARE(QString(testfiles::read("/tmp/box")),
+                 QString("域管终端提示读取/etc/zent/userinfo.json失败，错误原因是：No such file or directory"));
+        QVERIFY(QFile::rename("/tmp/info", testfiles::kInfoFile));
+    }
+
+    void agreedInterface()
+    {
         m_window->closewindow();
         emit m_window->findChild<InfoWidget*>()->shutdownClicked();
         QTRY_COMPARE(processrecord::entries("killall").size(), 1);

@@ -226,6 +226,13 @@ private slots:
         QCOMPARE(results, QList<bool>({true, false, true, false}));
         fixture::compare(m_signals, QJsonArray{"sigQuitControl 200 []", "sigQuitControl -6 ", "sigQuitControl 200 []",
                                                "sigQuitControl -6 "});
+        // While it stays, so does the connection.
+        for (const int limit : {20, 21}) {
+            m_messages->getNotifyMessageList(kName, true, 1, limit, [](bool, const auto&) {});
+            QTRY_COMPARE(m_messages->pendingRequests(), 0);
+        }
+        const auto sent = m_platform.requests("/box/v9/list");
+        QCOMPARE(sent.last()["connection"], sent[sent.size() - 2]["connection"]);
     }
 
     void aSlowServerIsPolledLess()

@@ -8,6 +8,7 @@
 #include "resumedialog.h"
 #include "sessionhost.h"
 #include "sizedicon.h"
+#include "themehelper.h"
 #include "toolkittitlebar.h"
 #include "trayclicks.h"
 #include "trayhost.h"
@@ -139,6 +140,16 @@ private slots:
         QVERIFY(icon->isVisible());
         m_window->shutdown();
         QVERIFY(!icon->isVisible());
+    }
+
+    void iconOfANewerDesktopFollowsTheTheme()
+    {
+        TrayIcon icon(1030, "name", nullptr);
+        icon.show();
+        const auto* shown = icon.findChild<QSystemTrayIcon*>();
+        QVERIFY(shown->icon().isNull());
+        emit ThemeHelper::instance()->themeTypeChanged(ThemeHelper::DarkType);
+        QVERIFY(!shown->icon().isNull());
     }
 
     void showsTheMessage()

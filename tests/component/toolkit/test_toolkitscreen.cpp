@@ -57,27 +57,18 @@ private slots:
         QTRY_COMPARE(changed.count(), 1);
         QCOMPARE(portal.asked, "org.freedesktop.appearance color-scheme");
         QTRY_VERIFY(ThemeHelper::instance()->children().isEmpty());
-        const char* const kAppearance = "org.freedesktop.appearance";
         const QPalette before = QApplication::palette();
-        // A setting that changes or, without a name, the lightness of the palette, which decides without a preference.
-        const std::tuple<const char*, const char*, int, ThemeHelper::ColorType> changes[] = {
-            {kAppearance, "contrast", 2, ThemeHelper::DarkType},
-            {"org.other", "color-scheme", 2, ThemeHelper::DarkType},
-            {kAppearance, "color-scheme", 1, ThemeHelper::DarkType},
-            {kAppearance, "color-scheme", 2, ThemeHelper::LightType},
-            {kAppearance, "color-scheme", 1, ThemeHelper::DarkType},
-            {kAppearance, "color-scheme", 0, ThemeHelper::LightType},
-            {nullptr, nullptr, 127, ThemeHelper::DarkType},
-            {nullptr, nullptr, 128, ThemeHelper::LightType},
-            {nullptr, nullptr, 0, ThemeHelper::DarkType},
-            {kAppearance, "color-scheme", 2, ThemeHelper::LightType}};
-        for (const auto& [nameSpace, key, value, type] : changes) {
+        for (const QJsonValue& change : fixture::read("themechanges.json")["changes"].toArray()) {
+            const QString setting = change["setting"].toString();
+            const int value = change["value"].toInt();
+            const auto type = change["dark"].toBool() ? ThemeHelper::DarkType : ThemeHelper::LightType;
+            // Its lightness decides while the portal has no preference.
             QPalette palette = before;
             palette.setColor(QPalette::Window, QColor(value, value, value));
-            if (key)
-                Portal::change(nameSpace, key, uint(value));
-            else
+            if (setting == "palette")
                 QApplication::setPalette(palette);
+            else
+                Portal::change(setting.section(' ', 0, 0), setting.section(' ', 1), uint(value));
             QTRY_COMPARE(ThemeHelper::instance()->themeType(), type);
             QCOMPARE(changed.last().constFirst().value<ThemeHelper::ColorType>(), type);
             QCOMPARE(dialog.palette(), ThemeHelper::palette(type));

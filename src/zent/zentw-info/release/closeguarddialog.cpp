@@ -9,7 +9,6 @@
 #include "httprules.h"
 #include "libzentoxa.h"
 #include "paths.h"
-#include "queuedinput.h"
 #include "release/releasereply.h"
 #include "release/schemapath.h"
 #include "release/spinerwin.h"
@@ -154,8 +153,6 @@ void closeGuarddialog::onCloseguardClicked()
 
 void closeGuarddialog::onRemoveDomainStatus(int status, const QString& body)
 {
-    // The request has blocked the window.
-    queuedinput::discard();
     // The dialog may go away while a message is on the screen.
     const QPointer<ToolkitPasswordEdit> password = m_password;
     const auto refuse = [this, &password](const QString& text) {
