@@ -182,6 +182,7 @@ class Used(ClientTest):
             self.until("the window state", settled)
         # Without a notification service a message is a balloon.
         self.stage.opened_by(lambda: self.push("Notify", "1", "zhangsan", "标题", "正文", "管理员"))
+        self.assertFalse(any("neither a notification service" in line for line in roomclient.syslog_lines()))
         self.desktop.run("wmctrl", "-i", "-c", self.desktop.panel())
         self.wait_hidden()
         self.desktop.click_icon()

@@ -201,6 +201,7 @@ private slots:
 
     void agreedInterface()
     {
+        QVERIFY(m_window->isAdminUser());
         m_window->closewindow();
         emit m_window->findChild<InfoWidget*>()->shutdownClicked();
         QTRY_COMPARE(processrecord::entries("killall").size(), 1);
