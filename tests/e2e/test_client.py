@@ -86,6 +86,12 @@ class Used(ClientTest):
         super().setUp()
         self.stage = Stage(self.desktop)
 
+    def show_panel(self):
+        panel = super().show_panel()
+        # The list of scenes makes it taller, which moves what is clicked.
+        self.until("the scenes", lambda: self.desktop.geometry(panel)[3] == 565)
+        return panel
+
     def push(self, method, *arguments):
         self.stage.call(NOTIFICATION, OBJECTS[NOTIFICATION], method, *arguments)
 

@@ -72,7 +72,7 @@ WrittenOut readGroup(QRegularExpressionMatchIterator& tokens)
         if (text == QLatin1String(")"))
             break;
         if (QStringLiteral("?*+{").contains(text.at(0))) {
-            // QRegExp takes what follows an unfinished count for its "}", and so reads another rule than this does.
+            // QRegExp takes what follows an unfinished count for its "}", and compiles another rule than is read here.
             const bool isUnfinished = text.startsWith(QLatin1Char('{')) && !text.endsWith(QLatin1Char('}'));
             last = isUnfinished ? kRefused : quantified(last, token);
             continue;

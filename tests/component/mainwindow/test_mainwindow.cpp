@@ -192,11 +192,12 @@ private slots:
         }
         m_boxes.instead = nullptr;
         int status = 0;
-        QVERIFY(waitpid(child, &status, 0) == child && WIFEXITED(status));
+        const pid_t ended = waitpid(child, &status, 0);
+        QVERIFY(QFile::rename("/tmp/info", testfiles::kInfoFile));
+        QVERIFY(ended == child && WIFEXITED(status));
         QCOMPARE(WEXITSTATUS(status), 255);
         QCOMPARE(QString(testfiles::read("/tmp/box")),
                  QString("域管终端提示读取/etc/zent/userinfo.json失败，错误原因是：No such file or directory"));
-        QVERIFY(QFile::rename("/tmp/info", testfiles::kInfoFile));
     }
 
     void agreedInterface()

@@ -62,7 +62,7 @@ private slots:
             const QString setting = change["setting"].toString();
             const int value = change["value"].toInt();
             const auto type = change["dark"].toBool() ? ThemeHelper::DarkType : ThemeHelper::LightType;
-            // Its lightness decides while the portal has no preference.
+            // The palette decides, by its lightness, while the portal has no preference.
             QPalette palette = before;
             palette.setColor(QPalette::Window, QColor(value, value, value));
             if (setting == "palette")

@@ -158,6 +158,7 @@ void Speaker::end(Result result)
 
 void Speaker::abandon(const std::shared_ptr<Exchange>& exchange)
 {
+    // An exchange that has not ended has a reply.
     if (m_exchange == exchange)
         m_reply->abort();
 }

@@ -153,7 +153,8 @@ void closeGuarddialog::onCloseguardClicked()
 
 void closeGuarddialog::onRemoveDomainStatus(int status, const QString& body)
 {
-    // The dialog may go away while a message is on the screen.
+    // The request has blocked the dialog. What was pressed meanwhile is lost, since the modal window that follows, a
+    // message or the spinner, takes the dialog's input. The dialog may go away while a message is on the screen.
     const QPointer<ToolkitPasswordEdit> password = m_password;
     const auto refuse = [this, &password](const QString& text) {
         showMessageBox(text);
